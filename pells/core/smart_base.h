@@ -1,0 +1,46 @@
+#pragma once
+
+#include <boost/smart_ptr/intrusive_ptr.hpp>
+#include <cstdint>
+
+#include "pells/core/export.h"
+
+namespace pells {
+
+/// Polymorphic base of the objects that the library holds through boost::intrusive_ptr.
+///
+/// An object starts with no references and deletes itself when the last intrusive pointer lets go;
+/// one that never meets an intrusive pointer belongs to whoever made it. The count is a plain
+/// integer: references to one object are taken and dropped on one thread.
+class PELLS_API smart_base {
+public:
+    virtual ~smart_base();
+
+    /// Takes one reference.
+    virtual void addRef();
+
+    /// Drops one reference and calls dispose() when none remains.
+    virtual void release();
+
+    /// Ends the object; here by deleting it through its virtual destructor.
+    virtual void dispose();
+
+protected:
+    smart_base() = default;
+
+    /// A copy is an object of its own: its count starts at 0, and assignment leaves both counts.
+    smart_base(const smart_base& /*other*/) {}
+    smart_base& operator=(const smart_base& /*other*/) { return *this; }
+
+private:
+    std::int32_t count = 0;
+};
+
+inline void intrusive_ptr_add_ref(smart_base* object) {
+    object->addRef();
+}
+inline void intrusive_ptr_release(smart_base* object) {
+    object->release();
+}
+
+}  // namespace pells

@@ -1,0 +1,60 @@
+#pragma once
+
+#include <cstdint>
+#include <ostream>
+#include <string>
+#include <utility>
+
+#include "pells/core/export.h"
+
+namespace pells {
+
+/// A version number of two parts, ordered by the first and then by the second.
+class PELLS_API Version {
+public:
+    typedef std::pair<std::int16_t, std::int16_t> Pair;
+
+    /// 0.0
+    Version() = default;
+    Version(std::int16_t majorNumber, std::int16_t minorNumber);
+    explicit Version(const Pair& numbers);
+
+    /// Reads "MAJOR.MINOR" or "MAJOR" (minor 0), in decimal.
+    ///
+    /// \throws boost::bad_lexical_cast when a part is no number of 16 bits, as in "", "1." and
+    ///         "1.5.3".
+    explicit Version(const std::string& text);
+
+    std::int16_t getMajor() const { return numbers.first; }
+    std::int16_t getMinor() const { return numbers.second; }
+    const Pair& getPair() const { return numbers; }
+
+    /// "MAJOR.MINOR"
+    std::string str() const;
+
+private:
+    Pair numbers{0, 0};
+};
+
+inline bool operator<(const Version& a, const Version& b) {
+    return a.getPair() < b.getPair();
+}
+inline bool operator<=(const Version& a, const Version& b) {
+    return a.getPair() <= b.getPair();
+}
+inline bool operator==(const Version& a, const Version& b) {
+    return a.getPair() == b.getPair();
+}
+inline bool operator!=(const Version& a, const Version& b) {
+    return a.getPair() != b.getPair();
+}
+inline bool operator>=(const Version& a, const Version& b) {
+    return a.getPair() >= b.getPair();
+}
+inline bool operator>(const Version& a, const Version& b) {
+    return a.getPair() > b.getPair();
+}
+
+PELLS_API std::ostream& operator<<(std::ostream& out, const Version& version);
+
+}  // namespace pells

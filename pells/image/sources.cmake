@@ -1,0 +1,3 @@
+pells_sources(image
+    HEADERS
+    SOURCES)

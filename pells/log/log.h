@@ -1,0 +1,125 @@
+#pragma once
+
+#include <fstream>
+#include <ios>
+#include <list>
+#include <map>
+#include <ostream>
+#include <string>
+#include <utility>
+
+#include "pells/core/no_destructor.h"
+#include "pells/core/singleton.h"
+#include "pells/log/stream_buffers.h"
+
+namespace pells {
+
+class Log;
+class LogKey;
+extern template class PELLS_API RogueSingleton<Log, SingletonFactory<Log>>;
+extern template class PELLS_API Singleton<Log, SingletonFactory<Log>>;
+
+/// Tagged diagnostic lines, written to "pells.log" in the current directory and to the debugger.
+///
+/// A line belongs to a tag, a dotted lower-case word such as "asset.open", and is written when the
+/// tag is on. Rules decide: words separated by spaces, tabs and line feeds, each a prefix of tags,
+/// or "*" for all of them, with "-" before it to switch them off; the last rule that fits a tag
+/// wins, and without one the tag is off. The rules are the preference "logdefault" followed by the
+/// preference "log" or, when both are empty, the file "pells.log.prefs" in the current directory.
+/// They are read once, when the log is created.
+///
+/// The log is created by the first logging site that runs. When the library is unloaded or the
+/// process exits, a log that still exists lists its tags (dumpTags()) and is closed.
+///
+/// A log file that cannot be opened or written receives nothing more; the debugger still does. One
+/// thread only.
+class PELLS_API Log : public Singleton<Log, SingletonFactory<Log>> {
+public:
+    ~Log() override;
+
+    /// Whether a tag is on. The first verdict on a tag that is kept is final.
+    ///
+    /// \param remember true keeps the verdict in the tag table.
+    bool isEnabled(const std::string& tag, bool remember);
+
+    /// isEnabled() that keeps the verdict.
+    bool registerTag(const std::string& tag);
+
+    /// The stream to write lines to; (re)opens "pells.log" if it is closed. Stays the log's.
+    std::ostream& getStream();
+
+    /// Puts everything written so far on disk and closes the file, if the tag "log.flush" is on.
+    void flush();
+
+    /// Puts everything written so far on disk and closes the file. The next line reopens it and is
+    /// appended.
+    void close();
+
+    /// Lists the tags registered so far, each with its verdict and the number of times it was asked
+    /// for, under the tag "log.dumptags".
+    void dumpTags();
+
+private:
+    friend class SingletonFactory<Log>;
+
+    struct TagState {
+        int useCount;
+        bool enabled;
+    };
+
+    /// \throws Prefs::NoImplementation when the application registered no preferences.
+    Log();
+
+    void readRules();
+    void writeHeader();
+    bool findVerdict(const std::string& tag) const;
+    void writeLine(const LogKey& key, const std::string& message);
+
+    std::list<std::pair<bool, std::string>> rules;
+    std::map<std::string, TagState> tagTable;
+    std::ofstream logFile;
+    std::ios_base::openmode openMode;
+    bool flushEach;
+    debugostream debugStream;
+    tee_ostream<> teeStream;
+};
+
+/// The tag of one logging site and whether it is on, decided once.
+///
+/// A site keeps a static key, so that a disabled site costs one test of a bool and builds no text;
+/// PELLS_LOG does all of it. The verdict outlives the log it came from. One thread only.
+class PELLS_API LogKey {
+public:
+    /// Registers the tag with the log, which is created if there is none.
+    ///
+    /// \throws Prefs::NoImplementation when the log has to be created and the application has
+    ///         registered no "Prefs" factory.
+    /// Cost: a map look-up; for a new tag also one pass over the rules.
+    explicit LogKey(const std::string& siteTag);
+
+    const std::string& getTag() const { return tag; }
+    bool isEnabled() const { return enabled; }
+
+private:
+    std::string tag;
+    bool enabled;
+};
+
+/// Writes one line if the tag is on: the tag, ": ", the message and a line feed.
+///
+///     PELLS_LOG("app.load", "read " << count << " parts of " << name);
+///
+/// The message is evaluated only when the tag is on. Format flags that it sets stay set on the
+/// log's stream, so it undoes them. The site's key is never destroyed: sites in destructors of
+/// static objects work to the end.
+#define PELLS_LOG(tag, message)                                               \
+    do {                                                                      \
+        static const ::pells::NoDestructor<::pells::LogKey> pellsLogKey{tag}; \
+        if (pellsLogKey->isEnabled()) {                                       \
+            ::pells::Log::instance().getStream()                              \
+                << pellsLogKey->getTag() << ": " << message << '\n';          \
+            ::pells::Log::instance().flush();                                 \
+        }                                                                     \
+    } while (false)
+
+}  // namespace pells

@@ -1,0 +1,3 @@
+pells_sources(log
+    HEADERS log.h stream_buffers.h stream_buffers.inl
+    SOURCES log.cpp stream_buffers.cpp)

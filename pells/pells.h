@@ -1,0 +1,19 @@
+#pragma once
+
+/// \file
+/// Everything the library offers.
+
+#include "pells/core/check_memory.h"
+#include "pells/core/class_name.h"
+#include "pells/core/factory.h"
+#include "pells/core/named_object.h"
+#include "pells/core/prefs.h"
+#include "pells/core/singleton.h"
+#include "pells/core/smart_base.h"
+#include "pells/core/strings.h"
+#include "pells/core/version.h"
+#include "pells/log/log.h"
+#include "pells/log/stream_buffers.h"
+#include "pells/platform/counter.h"
+#include "pells/platform/debugger.h"
+#include "pells/timing/performance.h"

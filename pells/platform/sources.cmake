@@ -1,0 +1,3 @@
+pells_sources(platform
+    HEADERS counter.h debugger.h
+    SOURCES counter.cpp debugger.cpp)

@@ -1,0 +1,145 @@
+#include "pells/timing/performance.h"
+
+#include <algorithm>
+#include <iomanip>
+#include <sstream>
+
+#include "pells/core/no_destructor.h"
+#include "pells/log/exit_hooks.h"
+#include "pells/platform/counter.h"
+
+namespace pells {
+
+template class NamedObject<PerformanceCategory, PerformanceCategory*>;
+template class DemandNamedObject<PerformanceCategory, PerformanceCategory*>;
+
+namespace {
+
+void writeLine(const LogKey& key, const std::string& message) {
+    Log::instance().getStream() << key.getTag() << ": " << message << '\n';
+    Log::instance().flush();
+}
+
+std::uint32_t percentage(std::uint32_t part, std::uint32_t whole) {
+    return whole == 0 ? 0 : static_cast<std::uint32_t>(std::uint64_t{part} * 100 / whole);
+}
+
+/// Writes the table of all categories; expects a log.
+void writeTimeSummary() {
+    static const NoDestructor<LogKey> key("time.summary");
+    if (!key->isEnabled())
+        return;
+    const std::vector<PerformanceCategory*> categories = PerformanceCategory::getAll();
+    std::uint32_t sum = 0;
+    std::size_t longest = 0;
+    for (const PerformanceCategory* category : categories) {
+        sum += category->total();
+        longest = std::max(longest, category->getName().size());
+    }
+    const int width = static_cast<int>(longest);
+
+    std::ostringstream line;
+    line << std::setw(width) << "Category"
+         << "      uS    (%)";
+    writeLine(*key, line.str());
+    for (const PerformanceCategory* category : categories) {
+        line.str("");
+        line << std::setw(width) << category->getName() << "  " << std::setw(6) << category->total()
+             << " (" << std::setw(3) << percentage(category->total(), sum) << "%)";
+        writeLine(*key, line.str());
+    }
+    line.str("");
+    line << std::setw(width) << "Total"
+         << "  " << std::setw(6) << sum;
+    writeLine(*key, line.str());
+}
+
+/// Writes the summary when the library is unloaded, unless the log is gone by then.
+class TimeSummaryHook {
+public:
+    TimeSummaryHook() = default;
+    TimeSummaryHook(const TimeSummaryHook&) = delete;
+    TimeSummaryHook& operator=(const TimeSummaryHook&) = delete;
+    ~TimeSummaryHook() {
+        if (Log::singleton)
+            writeTimeSummary();
+    }
+};
+
+}  // namespace
+
+void installTimeSummaryHook() {
+    static TimeSummaryHook hook;
+}
+
+PerformanceCategory::PerformanceCategory(const std::string& categoryName)
+    : DemandNamedObject<PerformanceCategory, PerformanceCategory*>(categoryName) {}
+
+PerformanceCategory::~PerformanceCategory() = default;
+
+std::vector<PerformanceCategory*>& PerformanceCategory::_stack() {
+    static NoDestructor<std::vector<PerformanceCategory*>> stack;
+    return *stack;
+}
+
+void PerformanceCategory::start(std::uint32_t t) {
+    startTime = t;
+}
+
+std::uint32_t PerformanceCategory::stop(std::uint32_t t) {
+    const std::uint32_t elapsed = t - startTime;
+    totalTime += elapsed;
+    startTime = t;
+    return elapsed;
+}
+
+std::uint32_t PerformanceCategory::push(PerformanceCategory* category, std::uint32_t t) {
+    std::vector<PerformanceCategory*>& stack = _stack();
+    if (!stack.empty())
+        stack.back()->stop(t);
+    stack.push_back(category);
+    category->start(t);
+    return category->total();
+}
+
+std::uint32_t PerformanceCategory::pop(std::uint32_t t) {
+    std::vector<PerformanceCategory*>& stack = _stack();
+    if (stack.empty())
+        return 0;
+    PerformanceCategory* const ended = stack.back();
+    ended->stop(t);
+    stack.pop_back();
+    if (!stack.empty())
+        stack.back()->start(t);
+    return ended->total();
+}
+
+Performance::Performance(const std::string& label, PerformanceCategory* chargedTo)
+    : name(label),
+      category(chargedTo),
+      startTime(getTimestamp()),
+      categoryTotalAtStart(category->total()),
+      key("time.detail." + category->getName()) {
+    if (key.isEnabled())
+        writeLine(key, "Entering " + name);
+    categoryTotalAtStart = PerformanceCategory::push(category, startTime);
+}
+
+Performance::~Performance() {
+    const std::uint32_t now = getTimestamp();
+    const std::uint32_t inclusive = now - startTime;
+    const std::uint32_t exclusive = PerformanceCategory::pop(now) - categoryTotalAtStart;
+    if (!key.isEnabled())
+        return;
+    std::ostringstream message;
+    message << "Leaving  " << name << " (" << inclusive << " uS, " << exclusive << " uS in "
+            << category->getName() << ')';
+    writeLine(key, message.str());
+}
+
+std::uint32_t Performance::getTimestamp() {
+    static const std::uint64_t frequency = platform::counterFrequency();
+    return static_cast<std::uint32_t>(platform::counter() * 1000000u / frequency);
+}
+
+}  // namespace pells

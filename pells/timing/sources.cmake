@@ -1,0 +1,3 @@
+pells_sources(timing
+    HEADERS performance.h
+    SOURCES performance.cpp)

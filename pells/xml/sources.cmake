@@ -1,0 +1,3 @@
+pells_sources(xml
+    HEADERS
+    SOURCES)
