@@ -17,3 +17,4 @@
 #include "pells/platform/counter.h"
 #include "pells/platform/debugger.h"
 #include "pells/timing/performance.h"
+#include "pells/material/color.h"

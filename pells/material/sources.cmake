@@ -1,3 +1,3 @@
 pells_sources(material
-    HEADERS
-    SOURCES)
+    HEADERS color.h
+    SOURCES color.cpp)

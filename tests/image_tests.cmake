@@ -1,0 +1,1 @@
+pells_add_test(color_test SOURCES color_test.cpp)
