@@ -18,3 +18,5 @@
 #include "pells/platform/debugger.h"
 #include "pells/timing/performance.h"
 #include "pells/material/color.h"
+#include "pells/image/image_base.h"
+#include "pells/image/image_loaders.h"
