@@ -37,6 +37,35 @@ bool readAll(std::istream& in, unsigned char* to, std::size_t size) {
     return in.gcount() == wanted;
 }
 
+/// The bytes that a stream buffer has at hand, for taking them without a copy.
+class GetArea : private std::streambuf {
+public:
+    explicit GetArea(std::istream& in) : buffer(*in.rdbuf()) {}
+
+    /// The next so many bytes, which count as read, or null when fewer are at hand. They stay until
+    /// the stream is used again.
+    const unsigned char* take(std::size_t size) {
+        // Named through this class, the protected operations may be called on any buffer.
+        const char* const next = (buffer.*&GetArea::gptr)();
+        if (static_cast<std::size_t>((buffer.*&GetArea::egptr)() - next) < size)
+            return nullptr;
+        (buffer.*&GetArea::gbump)(static_cast<int>(size));
+        return reinterpret_cast<const unsigned char*>(next);
+    }
+
+private:
+    std::streambuf& buffer;
+};
+
+/// The next so many bytes, where the stream has them or else in the scratch memory; null when the
+/// stream ends before.
+const unsigned char* nextBytes(std::istream& in, unsigned char* scratch, std::size_t size) {
+    const unsigned char* const atHand = in.good() ? GetArea(in).take(size) : nullptr;
+    if (atHand)
+        return atHand;
+    return readAll(in, scratch, size) ? scratch : nullptr;
+}
+
 /// Whether the stream can tell that it has at least so many bytes left.
 bool surelyHolds(std::istream& in, std::uint64_t size) {
     std::streambuf& buffer = *in.rdbuf();
@@ -208,11 +237,12 @@ std::unique_ptr<unsigned char[]> TGAFileLoader::_loadData(std::istream& in, int 
     if (surelyHolds(in, size) && !pixels.grow(rows))
         return nullptr;
 
-    unsigned char piece[16384 * 3];  // whole pixels of either size
+    unsigned char scratch[16384 * 3];  // whole pixels of either size
     for (std::uint64_t at = 0; at < size;) {
         const std::size_t count =
-            static_cast<std::size_t>(std::min<std::uint64_t>(sizeof piece, size - at));
-        if (!readAll(in, piece, count)) {
+            static_cast<std::size_t>(std::min<std::uint64_t>(sizeof scratch, size - at));
+        const unsigned char* const piece = nextBytes(in, scratch, count);
+        if (!piece) {
             PELLS_LOG("error", "tga file shorter than data");
             return nullptr;
         }
