@@ -16,4 +16,8 @@
 #include "pells/log/stream_buffers.h"
 #include "pells/platform/counter.h"
 #include "pells/platform/debugger.h"
+#include "pells/serial/enum.h"
+#include "pells/serial/member_field.h"
 #include "pells/timing/performance.h"
+#include "pells/xml/tag.h"
+#include "pells/xml/tokenizer.h"

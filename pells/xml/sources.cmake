@@ -1,3 +1,3 @@
 pells_sources(xml
-    HEADERS
-    SOURCES)
+    HEADERS attr_map.h tag.h tokenizer.h
+    SOURCES attr_map.cpp tag.cpp)
