@@ -1,3 +1,3 @@
 pells_sources(xml
-    HEADERS
-    SOURCES)
+    HEADERS tokenizer.h
+    SOURCES char_class.h stream_window.cpp stream_window.h tokenizer.cpp)
