@@ -163,7 +163,7 @@ TEST(Factories, CreateByNameForTheirOwnBaseOnly) {
         const std::unique_ptr<Shape> other(ShapeFactory::createByName("circle"));
         EXPECT_TRUE(dynamic_cast<Circle*>(one.get()));
         EXPECT_NE(one, other);
-        EXPECT_EQ(ShapeFactory::classNameOf(typeid(*one).name()), "circle");
+        EXPECT_EQ(ShapeFactory::classNameOf(typeid(Circle).name()), "circle");
         EXPECT_EQ(pells::AbstractFactory<Tool>::createByName("circle"), nullptr);
         EXPECT_TRUE(pells::AbstractFactory<Tool>::findCreator("circle").empty());
     }
