@@ -31,16 +31,15 @@ const pells::Factory<pells::Prefs, Settings> settingsFactory("Prefs");
 
 int showPicture(const std::string& name) {
     const boost::intrusive_ptr<pells::Image_base> image(new pells::Image_base(1, 1));
-    const int result =
-        pells::ImageFallbackManager::instance().setupNewImage(image.get(), name);
+    const int result = pells::ImageFallbackManager::instance().setupNewImage(image.get(), name);
     if (result != 0) {
         std::cerr << name << (result == 3 ? ": not in the table\n" : ": no loader could read it\n");
         return 1;
     }
     const unsigned char* const topLeft = image->getData();
     std::cout << name << ": " << image->getWidth() << " x " << image->getHeight() << ", "
-              << image->getNumComponents() * 8 << " bits, top left pixel " << int{topLeft[0]}
-              << ' ' << int{topLeft[1]} << ' ' << int{topLeft[2]} << '\n';
+              << image->getNumComponents() * 8 << " bits, top left pixel " << int{topLeft[0]} << ' '
+              << int{topLeft[1]} << ' ' << int{topLeft[2]} << '\n';
     return 0;
 }
 
