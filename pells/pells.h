@@ -17,3 +17,5 @@
 #include "pells/platform/counter.h"
 #include "pells/platform/debugger.h"
 #include "pells/timing/performance.h"
+#include "pells/timing/timer.h"
+#include "pells/timing/timestamp.h"
