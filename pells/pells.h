@@ -19,3 +19,4 @@
 #include "pells/timing/performance.h"
 #include "pells/timing/timer.h"
 #include "pells/timing/timestamp.h"
+#include "pells/xml/tokenizer.h"
