@@ -19,5 +19,7 @@
 #include "pells/serial/enum.h"
 #include "pells/serial/member_field.h"
 #include "pells/timing/performance.h"
+#include "pells/timing/timer.h"
+#include "pells/timing/timestamp.h"
 #include "pells/xml/tag.h"
 #include "pells/xml/tokenizer.h"
