@@ -26,3 +26,5 @@
 #include "pells/timing/timestamp.h"
 #include "pells/xml/tag.h"
 #include "pells/xml/tokenizer.h"
+#include "pells/undo/undo_redo_sequence.h"
+#include "pells/undo/undoable_step.h"
