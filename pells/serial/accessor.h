@@ -1,8 +1,8 @@
 #pragma once
 
+#include <type_traits>
 #include <typeinfo>
 #include <utility>
-#include <vector>
 
 #include "pells/core/export.h"
 #include "pells/core/no_destructor.h"
@@ -85,8 +85,13 @@ namespace detail {
 /// What accessors of one direction answer when they are used in the other one.
 template <class T>
 T* unusedValue() {
-    static NoDestructor<T> value;
-    return &*value;
+    if constexpr (std::is_trivially_destructible_v<T>) {
+        static T value{};
+        return &value;
+    } else {
+        static NoDestructor<T> value;
+        return &*value;
+    }
 }
 
 }  // namespace detail
