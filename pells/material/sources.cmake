@@ -1,3 +1,3 @@
 pells_sources(material
-    HEADERS color.h
-    SOURCES color.cpp)
+    HEADERS color.h material.h
+    SOURCES color.cpp material.cpp)

@@ -1,6 +1,7 @@
 #include "pells/undo/undo_redo_sequence.h"
 
 #include <algorithm>
+#include <utility>
 
 #include "pells/serial/member_field.h"
 

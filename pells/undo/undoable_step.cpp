@@ -1,5 +1,7 @@
 #include "pells/undo/undoable_step.h"
 
+#include <utility>
+
 #include "pells/serial/member_field.h"
 
 namespace pells {
