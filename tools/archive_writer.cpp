@@ -144,28 +144,34 @@ void ArchiveWriter::addFile(const std::string& name, const std::string& path) {
 void ArchiveWriter::addFolder(const std::string& folder) {
     checkUsable();
     const std::string root = withoutTrailingSlashes(folder);
+    boost::system::error_code error;
+    const fs::path realRoot = fs::canonical(root, error);
+    if (error)
+        throw FileError(folder, error.message());
     std::map<std::string, std::string> pathOfName;
     try {
-        const fs::path realRoot = fs::canonical(root);
         if (liesBelow(fs::canonical(fs::absolute(file.path()).parent_path()), realRoot))
             throw FileError(file.path(), "The archive would lie in the folder that it packs");
         for (const fs::directory_entry& entry : fs::recursive_directory_iterator(root)) {
-            if (fs::is_directory(fs::symlink_status(entry.path())))
-                continue;
             const std::string path = entry.path().generic_string();
             const std::string name = path.substr(root == "/" ? 1 : root.size() + 1);
-            const std::string why = obstacle(entry.path(), realRoot);
-            if (!why.empty())
-                refuse(name, why);
-            checkName(name);
-            pathOfName[name] = path;
+            if (!fs::is_directory(fs::symlink_status(entry.path()))) {
+                checkFile(name, obstacle(entry.path(), realRoot));
+                pathOfName[name] = path;
+            }
         }
-    } catch (const fs::filesystem_error& error) {
-        throw FileError(error.path1().empty() ? root : error.path1().string(),
-                        error.code().message());
+    } catch (const fs::filesystem_error& failure) {
+        throw FileError(failure.path1().empty() ? folder : failure.path1().string(),
+                        failure.code().message());
     }
     for (const auto& member : pathOfName)
         addFile(member.first, member.second);
+}
+
+void ArchiveWriter::checkFile(const std::string& name, const std::string& obstacle) const {
+    if (!obstacle.empty())
+        refuse(name, obstacle);
+    checkName(name);
 }
 
 void ArchiveWriter::addFrom(const std::string& name, const Source& source) {

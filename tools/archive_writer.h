@@ -105,6 +105,7 @@ private:
     void beginMember(const std::string& name);
     void endMember();
     void checkName(const std::string& name) const;
+    void checkFile(const std::string& name, const std::string& obstacle) const;
     void checkUsable() const;
     void write(const char* bytes, std::size_t count);
     void writeDirectory();
