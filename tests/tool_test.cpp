@@ -32,7 +32,10 @@ protected:
 
     /// Runs a script in which $PELLS is the tool.
     Outcome shell(const std::string& script) {
-        printed.write("script", "PELLS='" PELLS_TOOL "'\n" + script + "\n");
+        printed.write("script",
+                      "export LSAN_OPTIONS=print_suppressions=0:suppressions='" PELLS_SUPPRESSIONS
+                      "'\nPELLS='" PELLS_TOOL "'\n" +
+                          script + "\n");
         const std::string command = "bash '" + printed.path("script") + "' >'" +
                                     printed.path("out") + "' 2>'" + printed.path("err") + "'";
         const int status = std::system(command.c_str());
