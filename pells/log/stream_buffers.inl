@@ -4,6 +4,8 @@
 
 #include <stdexcept>
 
+#include "pells/log/stream_buffers.h"
+
 namespace pells {
 
 template <class C, class Traits>

@@ -1,3 +1,3 @@
 pells_sources(timing
-    HEADERS performance.h
-    SOURCES performance.cpp)
+    HEADERS performance.h timer.h timestamp.h
+    SOURCES performance.cpp timer.cpp timestamp.cpp)

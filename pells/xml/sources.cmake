@@ -1,3 +1,3 @@
 pells_sources(xml
-    HEADERS
-    SOURCES)
+    HEADERS attr_map.h tag.h tokenizer.h
+    SOURCES attr_map.cpp char_class.h stream_window.cpp stream_window.h tag.cpp tokenizer.cpp)

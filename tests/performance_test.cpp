@@ -1,0 +1,72 @@
+#include "pells/timing/performance.h"
+
+#include <gtest/gtest.h>
+
+#include <regex>
+
+#include "pells/platform/counter.h"
+#include "support/test_prefs.h"
+
+namespace {
+
+using pells::Performance;
+using pells::PerformanceCategory;
+
+TEST(PerformanceCategories, ChargeOnlyTheInnermost) {
+    PerformanceCategory& a = PerformanceCategory::find("a");
+    PerformanceCategory& b = PerformanceCategory::find("b");
+    EXPECT_EQ(PerformanceCategory::pop(5), 0u);
+
+    // The clock wraps between the two pushes.
+    EXPECT_EQ(PerformanceCategory::push(&a, 0xFFFFFFF0u), 0u);
+    EXPECT_EQ(PerformanceCategory::push(&b, 0x10u), 0u);
+    EXPECT_EQ(a.total(), 0x20u);
+    EXPECT_EQ(PerformanceCategory::push(&b, 0x30u), 0x20u);
+    EXPECT_EQ(PerformanceCategory::pop(0x31u), 0x21u);
+    EXPECT_EQ(PerformanceCategory::pop(0x41u), 0x31u);
+    EXPECT_EQ(PerformanceCategory::pop(0x51u), 0x30u);
+    EXPECT_EQ(b.total(), 0x31u);
+    EXPECT_EQ(a.stop(0x61u), 0x10u);
+}
+
+class ProbeTest : public pells_test::LibraryTest {};
+
+void spend(std::uint64_t microseconds) {
+    const std::uint64_t start = pells::platform::counter();
+    while (pells::platform::counter() - start < microseconds) {
+    }
+}
+
+TEST_F(ProbeTest, LogsItsWholeTimeAndTheCategorysShare) {
+    pells_test::prefs() = {{"log", "time.detail log.dumptags"}};
+    {
+        const Performance outer("outer", &PerformanceCategory::find("work"));
+        const Performance inner("inner", &PerformanceCategory::find("rest"));
+        spend(2000);
+    }
+    pells::Log::instance().dumpTags();
+    const std::vector<std::string> lines = pells_test::logLines();
+    ASSERT_GE(lines.size(), 4u);
+    EXPECT_EQ(lines[0], "time.detail.work: Entering outer");
+    EXPECT_EQ(lines[1], "time.detail.rest: Entering inner");
+    std::smatch match;
+    const std::regex innerExit(
+        "time\\.detail\\.rest: Leaving  inner \\((\\d+) uS, (\\d+) uS in rest\\)");
+    ASSERT_TRUE(std::regex_match(lines[2], match, innerExit)) << lines[2];
+    EXPECT_GE(std::stoul(match[1]), 2000u);
+    const std::regex outerExit(
+        "time\\.detail\\.work: Leaving  outer \\((\\d+) uS, (\\d+) uS in work\\)");
+    ASSERT_TRUE(std::regex_match(lines[3], match, outerExit)) << lines[3];
+    EXPECT_GE(std::stoul(match[1]), 2000u);
+    EXPECT_LE(std::stoul(match[2]) + 2000u, std::stoul(match[1]));
+}
+
+TEST_F(ProbeTest, RegistersItsTagEveryTime) {
+    pells_test::prefs() = {{"log", "log.dumptags"}};
+    for (int i = 0; i < 5; ++i)
+        const Performance probe("p", &PerformanceCategory::find("work"));
+    pells::Log::instance().dumpTags();
+    EXPECT_EQ(pells_test::logLines().at(3), "log.dumptags: off   5  time.detail.work");
+}
+
+}  // namespace

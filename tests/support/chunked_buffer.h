@@ -1,0 +1,49 @@
+#pragma once
+
+#include <algorithm>
+#include <cstring>
+#include <memory>
+#include <streambuf>
+#include <string>
+
+namespace pells_test {
+
+/// Gives a text in pieces of a chosen size. Each piece is a block of its own that goes when the
+/// next one comes, so that an address sanitizer sees who looks past its ends or back at it.
+class ChunkedBuffer : public std::streambuf {
+public:
+    /// \param size characters in a piece; 0: the buffer shows no piece, only single characters.
+    ChunkedBuffer(const std::string& whole, std::size_t size) : text(whole), chunk(size) {}
+
+    /// Characters that were taken from the buffer.
+    std::size_t taken() const { return given - static_cast<std::size_t>(egptr() - gptr()); }
+
+protected:
+    int_type underflow() override {
+        if (given == text.size())
+            return traits_type::eof();
+        if (chunk != 0) {
+            const std::size_t size = std::min(chunk, text.size() - given);
+            piece.reset(new char[size]);
+            std::memcpy(piece.get(), text.data() + given, size);
+            given += size;
+            setg(piece.get(), piece.get(), piece.get() + size);
+            return traits_type::to_int_type(*gptr());
+        }
+        return traits_type::to_int_type(text[given]);
+    }
+
+    int_type uflow() override {
+        if (chunk != 0)
+            return std::streambuf::uflow();
+        return given == text.size() ? traits_type::eof() : traits_type::to_int_type(text[given++]);
+    }
+
+private:
+    const std::string& text;
+    std::size_t chunk;
+    std::size_t given = 0;
+    std::unique_ptr<char[]> piece;
+};
+
+}  // namespace pells_test
