@@ -13,6 +13,7 @@
 #include "pells/core/strings.h"
 #include "pells/core/version.h"
 #include "pells/image/image_base.h"
+#include "pells/image/image_fallback_manager.h"
 #include "pells/image/image_loaders.h"
 #include "pells/log/log.h"
 #include "pells/log/stream_buffers.h"

@@ -1,6 +1,5 @@
 #include <gtest/gtest.h>
 
-#include <algorithm>
 #include <cstdlib>
 #include <fstream>
 #include <new>
@@ -10,25 +9,30 @@
 
 #include "pells/image/image_base.h"
 #include "pells/image/image_loaders.h"
+#include "support/chunked_buffer.h"
 #include "support/test_prefs.h"
 #include "support/tga_file.h"
 
 namespace {
 
+/// In arrays, which is what pixels are kept in.
 std::size_t allocatedBytes = 0;
 
 }  // namespace
 
-void* operator new(std::size_t size) {
+void* operator new[](std::size_t size, const std::nothrow_t& /*tag*/) noexcept {
     allocatedBytes += size;
-    if (void* const memory = std::malloc(size == 0 ? 1 : size))
+    return std::malloc(size == 0 ? 1 : size);
+}
+void* operator new[](std::size_t size) {
+    if (void* const memory = operator new[](size, std::nothrow))
         return memory;
     throw std::bad_alloc();
 }
-void operator delete(void* memory) noexcept {
+void operator delete[](void* memory) noexcept {
     std::free(memory);
 }
-void operator delete(void* memory, std::size_t /*size*/) noexcept {
+void operator delete[](void* memory, std::size_t /*size*/) noexcept {
     std::free(memory);
 }
 
@@ -39,37 +43,33 @@ using pells::TGAFileLoader;
 using pells_test::tgaFile;
 using pells_test::tgaHeader;
 
-/// Hands out a few bytes at a time, knows no end and cannot seek; a damaged one throws in the end.
-class SlowBuffer : public std::streambuf {
+/// Throws where its bytes end.
+class DamagedBuffer : public pells_test::ChunkedBuffer {
 public:
-    SlowBuffer(const std::string& file, bool endsInDamage) : bytes(file), isDamaged(endsInDamage) {}
+    using ChunkedBuffer::ChunkedBuffer;
 
 private:
     int_type underflow() override {
-        if (at == bytes.size() && isDamaged)
+        const int_type next = ChunkedBuffer::underflow();
+        if (next == traits_type::eof())
             throw std::runtime_error("damaged");
-        const std::size_t count = std::min<std::size_t>(1000, bytes.size() - at);
-        char* const next = bytes.data() + at;
-        setg(next, next, next + count);
-        at += count;
-        return count == 0 ? traits_type::eof() : traits_type::to_int_type(*next);
+        return next;
     }
-
-    std::string bytes;
-    std::size_t at = 0;
-    bool isDamaged;
 };
 
+/// Hands out a few bytes at a time, knows no end and cannot seek; a damaged one throws in the end.
 class SlowStream : public std::istream {
 public:
-    explicit SlowStream(const std::string& file, bool endsInDamage = false)
-        : std::istream(nullptr), buffer(file, endsInDamage) {
-        rdbuf(&buffer);
+    explicit SlowStream(const std::string& file, bool isDamaged = false)
+        : std::istream(nullptr), bytes(file), good(bytes, 1000), damaged(bytes, 1000) {
+        rdbuf(isDamaged ? &damaged : &good);
         exceptions(std::ios_base::badbit);
     }
 
 private:
-    SlowBuffer buffer;
+    std::string bytes;
+    pells_test::ChunkedBuffer good;
+    DamagedBuffer damaged;
 };
 
 class Tga : public pells_test::LibraryTest {
@@ -98,7 +98,7 @@ std::string shown(const std::string& file, int width, int height, int depth, boo
             const std::string pixel =
                 file.substr(18 + static_cast<std::size_t>(row * width + x) * step, step);
             if (step == 1)
-                rows += pixel + pixel + pixel;
+                rows.append(3, pixel[0]);
             else
                 rows += {pixel[2], pixel[1], pixel[0]};
             if (step == 4)
@@ -209,7 +209,7 @@ TEST_F(Tga, SurvivesEveryCutAndEveryFlippedBitOfItsHeader) {
             EXPECT_FALSE(load(file.substr(0, size))) << size;
             EXPECT_FALSE(image.isValid()) << size;
         }
-        for (std::size_t bit = 0; bit < 18 * 8; ++bit) {
+        for (std::size_t bit = 0; bit < 144; ++bit) {
             std::string flipped = file;
             flipped[bit / 8] = static_cast<char>(flipped[bit / 8] ^ (1 << bit % 8));
             const bool loaded = load(flipped);
@@ -222,7 +222,7 @@ TEST_F(Tga, SurvivesEveryCutAndEveryFlippedBitOfItsHeader) {
 TEST_F(Tga, TakesMemoryAsItsBytesArriveNotAsItsHeaderClaims) {
     for (const int depth : {8, 24, 32}) {
         EXPECT_FALSE(load(tgaHeader(65535, 65535, depth)));  // the log line has its memory now
-        for (const std::size_t delivered : {0, 100000, 1000000}) {
+        for (const std::size_t delivered : {0U, 100000U, 1000000U}) {
             const std::string file = tgaHeader(65535, 65535, depth) + std::string(delivered, 'x');
             SlowStream in(file);
             const std::size_t before = allocatedBytes;
@@ -235,7 +235,7 @@ TEST_F(Tga, TakesMemoryAsItsBytesArriveNotAsItsHeaderClaims) {
 TEST_F(Tga, WhoseStreamThrowsLeavesTheImageUsable) {
     for (const int depth : {8, 24, 32}) {
         const std::string file = tgaFile(300, 200, depth);
-        for (const std::size_t delivered : {0, 10, 18, 1000, 59000}) {
+        for (const std::size_t delivered : {0U, 10U, 18U, 1000U, 59000U}) {
             SlowStream in(file.substr(0, delivered), true);
             EXPECT_THROW(TGAFileLoader::loadTarga(&image, in), std::runtime_error);
             EXPECT_FALSE(image.isValid());

@@ -3,10 +3,14 @@
 #include <algorithm>
 #include <array>
 #include <cstring>
+#include <exception>
 #include <limits>
 #include <new>
 #include <vector>
 
+#include "pells/asset/zlib_wrapper.h"
+#include "pells/image/image_loaders.h"
+#include "pells/log/log.h"
 #include "pells/material/color.h"
 
 namespace pells {
@@ -38,7 +42,7 @@ std::size_t rgbaBytes(int pixelsWide, int pixelsHigh) {
         throw std::bad_array_new_length();
     const std::uint64_t pixels =
         static_cast<std::uint64_t>(pixelsWide) * static_cast<std::uint64_t>(pixelsHigh);
-    if (pixels > std::numeric_limits<std::size_t>::max() / 4)
+    if (pixels > std::numeric_limits<std::ptrdiff_t>::max() / 4)
         throw std::bad_array_new_length();
     return static_cast<std::size_t>(pixels * 4);
 }
@@ -99,6 +103,16 @@ Image_base::Image_base(int pixelsWide, int pixelsHigh)
       format(FMT_RGBA),
       data(new unsigned char[rgbaBytes(pixelsWide, pixelsHigh)]) {}
 
+Image_base::Image_base(const std::string& name) : fileName(name) {
+    const std::string::size_type dot = name.rfind('.');
+    if (dot != std::string::npos)
+        extension = name.substr(dot);
+    if (extension == ".pell") {
+        loadPellFileImage(name);
+        loadedFromPell = true;
+    }
+}
+
 Image_base::~Image_base() = default;
 
 void Image_base::init() {
@@ -131,6 +145,26 @@ void Image_base::makeBogusImage() {
     height = 2;
     numComponents = 4;
     bogus = true;
+}
+
+void Image_base::loadTarga(const std::string& name) {
+    TGAFileLoader loader(name.c_str());
+    bool loaded = false;
+    try {
+        loaded = loader.uploadImage(this);
+    } catch (const ZlibWrapper::ZlibError&) {
+        // It left its line in the log when it was made.
+    } catch (const std::exception& failure) {
+        PELLS_LOG("error",
+                  "Image(" << loader.getFileName() << "): Can't read image: " << failure.what());
+    }
+    if (!loaded)
+        makeBogusImage();
+}
+
+void Image_base::loadPellFileImage(const std::string& name) {
+    if (!PellTGAFileLoader(name.c_str()).uploadImage(this))
+        makeBogusImage();
 }
 
 bool Image_base::dimensionsArePowerOfTwo() const {

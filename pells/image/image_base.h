@@ -33,6 +33,11 @@ public:
     /// \throws std::bad_alloc when a size is negative or there is no memory for it.
     Image_base(int pixelsWide, int pixelsHigh);
 
+    /// An image from a file. A name that ends in ".pell" is that of an archive in the file system,
+    /// whose picture is loaded as loadPellFileImage() does. For any other name nothing is loaded
+    /// and the image is empty: derived classes load other files.
+    explicit Image_base(const std::string& name);
+
     Image_base(const Image_base&) = delete;
     Image_base& operator=(const Image_base&) = delete;
     ~Image_base() override;
@@ -123,6 +128,14 @@ protected:
 
     /// Makes the image the substitute.
     void makeBogusImage();
+
+    /// Fills the image from a TGA file that the AssetManager finds, or makes it the substitute.
+    /// Throws nothing: lines under "error" tell why the file could not be read.
+    void loadTarga(const std::string& name);
+
+    /// Fills the image from the TGA picture that a pell archive, a file of that name, holds as its
+    /// member "tga", or makes it the substitute. Throws nothing, as loadTarga().
+    void loadPellFileImage(const std::string& name);
 
     int width = 0;
     int height = 0;
