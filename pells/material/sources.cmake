@@ -1,3 +1,3 @@
 pells_sources(material
-    HEADERS
-    SOURCES)
+    HEADERS color.h material.h
+    SOURCES color.cpp material.cpp)

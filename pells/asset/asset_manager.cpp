@@ -1,0 +1,381 @@
+#include "pells/asset/asset_manager.h"
+
+#include <algorithm>
+#include <boost/filesystem/operations.hpp>
+#include <ctime>
+#include <limits>
+#include <ostream>
+
+#include "pells/asset/asset_path.h"
+#include "pells/asset/regular_file.h"
+#include "pells/core/class_name.h"
+#include "pells/core/prefs.h"
+#include "pells/log/log.h"
+
+namespace pells {
+
+template class RogueSingleton<AssetManager, SingletonFactory<AssetManager>>;
+template class Singleton<AssetManager, SingletonFactory<AssetManager>>;
+
+namespace fs = boost::filesystem;
+
+namespace {
+
+std::int32_t toTimestamp(std::time_t time) {
+    typedef std::numeric_limits<std::int32_t> Limits;
+    return static_cast<std::int32_t>(
+        std::max<std::intmax_t>(Limits::min(), std::min<std::intmax_t>(Limits::max(), time)));
+}
+
+bool endsWith(const std::string& text, const std::string& ending) {
+    return text.size() >= ending.size() &&
+           text.compare(text.size() - ending.size(), ending.size(), ending) == 0;
+}
+
+fs::file_type typeOf(const fs::path& path) {
+    boost::system::error_code ignored;
+    return fs::status(path, ignored).type();
+}
+
+/// What exists below the root under an asset's name.
+fs::file_type typeOfAsset(const std::string& name) {
+    return isNativeName(name) ? typeOf(assetPath(name)) : fs::file_not_found;
+}
+
+/// Tells which names of a sorted sequence lie in folders that are not there, so that a large
+/// archive without its folders costs one look a folder and none a member.
+class MissingFolders {
+public:
+    explicit MissingFolders(const fs::path& assetRootPath) : root(assetRootPath) {}
+
+    bool hold(const std::string& name) {
+        const std::string::size_type slash = name.rfind('/');
+        // For a name that may be too long, the file system's answer is another one.
+        if (slash == std::string::npos || name.size() > 200)
+            return false;
+        if (folder.empty() || name.compare(0, slash + 1, folder) != 0) {
+            folder = name.substr(0, slash + 1);
+            missing = typeOf(root / folder) == fs::file_not_found;
+        }
+        return missing;
+    }
+
+private:
+    fs::path root;
+    std::string folder;
+    bool missing = false;
+};
+
+}  // namespace
+
+std::string assetRoot() {
+    return Prefs::instance().getString("assetLocation");
+}
+
+fs::path assetPath(const std::string& name) {
+    return fs::path(assetRoot()) / name;
+}
+
+/// Begins the lines of one getFileStream().
+class AssetManager::OpeningPrefix {
+public:
+    OpeningPrefix(const AssetManager& openingManager, const std::string& openedName)
+        : manager(openingManager), name(openedName) {}
+
+    friend std::ostream& operator<<(std::ostream& out, const OpeningPrefix& prefix) {
+        return out << className(typeid(prefix.manager)) << "::getFileStream(" << prefix.name
+                   << "): ";
+    }
+
+private:
+    const AssetManager& manager;
+    const std::string& name;
+};
+
+/// Begins the lines of one listfiles(), and knows whether any was written.
+class AssetManager::ListingPrefix {
+public:
+    ListingPrefix(const std::string& listedDir, bool listsDirs) : dir(listedDir), dirs(listsDirs) {}
+
+    friend std::ostream& operator<<(std::ostream& out, const ListingPrefix& prefix) {
+        prefix.written = true;
+        return out << "listfiles(" << prefix.dir << ", " << (prefix.dirs ? "dirs" : "files")
+                   << "): ";
+    }
+
+    bool wasWritten() const { return written; }
+
+private:
+    const std::string& dir;
+    bool dirs;
+    mutable bool written = false;
+};
+
+AssetManager::AssetManager() {
+    const std::string root = assetRoot();
+    scanRoot(root);
+    if (archives.empty())
+        PELLS_LOG("asset.ctor", "Asset manager has no .asset files to check.");
+    preferNewerFiles(root);
+    buildAliases();
+}
+
+AssetManager::~AssetManager() {
+    archives.clear();
+}
+
+void AssetManager::scanRoot(const std::string& root) {
+    for (fs::directory_iterator entry(root), end; entry != end; ++entry) {
+        const std::string path = entry->path().string();
+        PELLS_LOG("asset.iter", "Found " << path);
+        if (typeOf(path) == fs::directory_file)
+            PELLS_LOG("asset.iter", "  which is a directory, skipping");
+        else if (!endsWith(path, ".asset"))
+            PELLS_LOG("asset.iter", "  which isn't a .asset file, skipping");
+        else
+            addArchive(path);
+    }
+}
+
+void AssetManager::addArchive(const std::string& path) {
+    std::unique_ptr<pellistream> archive;
+    try {
+        archive.reset(new pellistream(path));
+    } catch (const pellibuf::BadPellFile& reason) {
+        PELLS_LOG("error", "Bad .asset file: " << path << ": " << reason.what());
+        return;
+    }
+    const std::int32_t timestamp = toTimestamp(fs::last_write_time(path));
+    archiveTimes.push_back(timestamp);
+    archives.emplace_back(path, std::move(archive));
+    cacheMembers(*archives.back().second, timestamp);
+}
+
+void AssetManager::cacheMembers(pellistream& archive, std::int32_t timestamp) {
+    // An archive's names are sorted, too, so most go right behind the one before.
+    Cache::iterator place = cache.begin();
+    for (const std::string& member : archive) {
+        PELLS_LOG("asset.entries", ">>> For this asset file, found entry: " << member);
+        const Cache::iterator entry = cache.try_emplace(place, member);
+        place = std::next(entry);
+        if (!entry->second || entry->second->getTimestamp() < timestamp)
+            entry->second.reset(new MemberOpener(member, timestamp, &archive));
+    }
+}
+
+void AssetManager::preferNewerFiles(const std::string& root) {
+    MissingFolders missingFolders(root);
+    for (Cache::value_type& entry : cache) {
+        if (missingFolders.hold(entry.first) || !isNativeName(entry.first))
+            continue;
+        const fs::path file = fs::path(root) / entry.first;
+        boost::system::error_code error;
+        const std::int32_t timestamp = toTimestamp(fs::last_write_time(file, error));
+        if (!error) {
+            if (timestamp > entry.second->getTimestamp())
+                entry.second.reset(new FileOpener(file.string(), timestamp));
+        } else if (typeOf(file) != fs::file_not_found) {
+            const fs::filesystem_error reason("last_write_time", file, error);
+            PELLS_LOG("error",
+                      "Can't get timestamp for file " << file.string() << ": " << reason.what());
+        }
+    }
+}
+
+std::string AssetManager::fixName(const std::string& name) {
+    std::string fixed = name;
+    std::replace(fixed.begin(), fixed.end(), '\\', '/');
+    return fixed;
+}
+
+AssetManager::CacheRange AssetManager::getSubdirRange(const std::string& dir) const {
+    if (dir.empty())
+        return CacheRange(cache.begin(), cache.end());
+    // '0' follows '/'.
+    return CacheRange(cache.lower_bound(dir + '/'), cache.lower_bound(dir + '0'));
+}
+
+boost::intrusive_ptr<baseiStreamContainer> AssetManager::getFileStream(const std::string& name,
+                                                                       bool flag) {
+    const std::string fixed = fixName(name);
+    const OpeningPrefix prefix(*this, fixed);
+    Cache::const_iterator cached = cache.find(fixed);
+    if (cached != cache.end()) {
+        PELLS_LOG("asset.open", prefix << "found in cache");
+        return cached->second->open(flag);
+    }
+    const auto alias = aliases.find(fixed);
+    if (alias != aliases.end()) {
+        cached = cache.find(alias->second);
+        if (cached != cache.end()) {
+            PELLS_LOG("asset.open", prefix << "not in cache, but alias is: " << alias->second);
+            return cached->second->open(flag);
+        }
+        PELLS_LOG("asset.open", prefix << "alias not in cache: " << alias->second);
+    }
+    const std::string& real = alias != aliases.end() ? alias->second : fixed;
+    PELLS_LOG("asset.open", prefix << real << " not in cache, trying filesystem");
+    const boost::intrusive_ptr<Opener> opener(new FileOpener(assetPath(real).string(), 0));
+    return opener->open(flag);
+}
+
+bool AssetManager::isFile(const std::string& name) const {
+    const std::string fixed = fixName(name);
+    if (cache.count(fixed) != 0)
+        return true;
+    const fs::file_type type = typeOfAsset(fixed);
+    return type != fs::status_error && type != fs::file_not_found && type != fs::directory_file;
+}
+
+bool AssetManager::isDir(const std::string& name) const {
+    const std::string fixed = fixName(name);
+    const CacheRange range = getSubdirRange(fixed);
+    return range.first != range.second || typeOfAsset(fixed) == fs::directory_file;
+}
+
+std::vector<std::string> AssetManager::listfiles(const std::string& dir, bool dirs) const {
+    return listFolder(dir, dirs, true);
+}
+
+/// listfiles(), or its part that comes from archives.
+std::vector<std::string> AssetManager::listFolder(const std::string& dir, bool dirs,
+                                                  bool onDisk) const {
+    const ListingPrefix prefix(dir, dirs);
+    const std::string fixed = fixName(dir);
+    std::vector<std::string> names;
+    listCached(fixed, dirs, prefix, names);
+    if (onDisk)
+        listFileSystem(fixed, dirs, prefix, names);
+    return names;
+}
+
+void AssetManager::listCached(const std::string& dir, bool dirs, const ListingPrefix& prefix,
+                              std::vector<std::string>& names) const {
+    const std::string::size_type start = dir.empty() ? 0 : dir.size() + 1;
+    const CacheRange range = getSubdirRange(dir);
+    for (Cache::const_iterator entry = range.first; entry != range.second;) {
+        const std::string& key = entry->first;
+        const std::string::size_type slash = key.find('/', start);
+        const bool inSubdir = slash != std::string::npos;
+        PELLS_LOG("asset.iter", prefix << "considering " << key);
+        if (!dirs && inSubdir) {
+            PELLS_LOG("asset.list", prefix << "skipping subdir file: " << key.substr(start));
+        } else if (!dirs) {
+            names.push_back(key.substr(start));
+            PELLS_LOG("asset.list", prefix << "from cache: " << names.back());
+        } else if (!inSubdir) {
+            PELLS_LOG("asset.list", prefix << "skipping plain file: " << key.substr(start));
+        } else {
+            const std::string subdir = key.substr(start, slash - start);
+            PELLS_LOG("asset.list", prefix << "from cache: " << subdir);
+            // What lies in one folder lies side by side.
+            if (names.empty() || names.back() != subdir)
+                names.push_back(subdir);
+        }
+        // Without lines to write for each, the entries in a folder are passed over as a whole.
+        if (inSubdir && !prefix.wasWritten())
+            entry = cache.lower_bound(key.substr(0, slash) + '0');
+        else
+            ++entry;
+    }
+}
+
+void AssetManager::listFileSystem(const std::string& dir, bool dirs, const ListingPrefix& prefix,
+                                  std::vector<std::string>& names) const {
+    if (!isNativeName(dir))
+        return;
+    const fs::path folder = assetPath(dir);
+    const std::string start = dir.empty() ? dir : dir + '/';
+    boost::system::error_code error;
+    for (fs::directory_iterator entry(folder, error), end; !error && entry != end;
+         entry.increment(error)) {
+        if ((typeOf(entry->path()) == fs::directory_file) != dirs)
+            continue;
+        const std::string name = entry->path().filename().string();
+        PELLS_LOG("asset.list", prefix << "from filesystem: " << name);
+        const std::string key = start + name;
+        const CacheRange below = dirs ? getSubdirRange(key) : CacheRange();
+        if (dirs ? below.first == below.second : cache.count(key) == 0)
+            names.push_back(name);
+    }
+    if (error && typeOf(folder) != fs::file_not_found) {
+        const fs::filesystem_error reason("directory_iterator", folder, error);
+        PELLS_LOG("error", prefix << "Can't list directory in filesystem: " << reason.what());
+    }
+}
+
+AssetManager::Resolution AssetManager::resolve(const std::string& name) const {
+    Resolution found;
+    std::string real = fixName(name);
+    Cache::const_iterator cached = cache.find(real);
+    const auto alias = aliases.find(real);
+    if (cached == cache.end() && alias != aliases.end()) {
+        real = found.alias = alias->second;
+        cached = cache.find(real);
+    }
+    if (cached != cache.end()) {
+        describe(*cached->second, found);
+    } else if (isRegularFile(assetPath(real).string())) {
+        found.source = Resolution::FILE_SYSTEM;
+        found.path = assetPath(real).string();
+    }
+    const std::int32_t timestamp = cached == cache.end() ? 0 : cached->second->getTimestamp();
+    for (std::size_t i = 0; cached != cache.end() && i < archives.size(); ++i) {
+        const bool serves =
+            found.source == Resolution::ARCHIVE_MEMBER && found.path == archives[i].first;
+        if (serves || archives[i].second->getDirectory().count(real) == 0)
+            continue;
+        found.overridden.push_back(archives[i].first);
+        if (found.source == Resolution::ARCHIVE_MEMBER && archiveTimes[i] == timestamp)
+            found.tie = true;
+    }
+    return found;
+}
+
+/// Fills in what an opener of the cache says.
+void AssetManager::describe(const Opener& opener, Resolution& found) const {
+    if (const auto* member = dynamic_cast<const MemberOpener*>(&opener)) {
+        found.source = Resolution::ARCHIVE_MEMBER;
+        found.member = member->getName();
+        for (const auto& archive : archives) {
+            if (archive.second.get() == member->getArchive())
+                found.path = archive.first;
+        }
+    } else if (isRegularFile(opener.getName())) {
+        found.source = Resolution::NEWER_FILE;
+        found.path = opener.getName();
+    }
+}
+
+AssetManager::Opener::Opener(std::string sourceName, std::int32_t sourceTimestamp)
+    : name(std::move(sourceName)), timestamp(sourceTimestamp) {}
+
+AssetManager::Opener::~Opener() = default;
+
+AssetManager::FileOpener::FileOpener(std::string path, std::int32_t writeTime)
+    : Opener(std::move(path), writeTime) {}
+
+AssetManager::FileOpener::~FileOpener() = default;
+
+boost::intrusive_ptr<baseiStreamContainer> AssetManager::FileOpener::open(bool /*flag*/) {
+    try {
+        return boost::intrusive_ptr<baseiStreamContainer>(new iTemporaryStreamContainer(getName()));
+    } catch (const iTemporaryStreamContainer::CantOpen&) {
+        PELLS_LOG("error", "Couldn't open the specified file from disc: " << getName());
+    }
+    return nullptr;
+}
+
+AssetManager::MemberOpener::MemberOpener(std::string member, std::int32_t writeTime,
+                                         pellistream* openArchive)
+    : Opener(std::move(member), writeTime), archive(openArchive) {}
+
+AssetManager::MemberOpener::~MemberOpener() = default;
+
+boost::intrusive_ptr<baseiStreamContainer> AssetManager::MemberOpener::open(bool /*flag*/) {
+    if (!archive->open(getName()))
+        return nullptr;
+    return boost::intrusive_ptr<baseiStreamContainer>(new iExistingStreamContainer(*archive));
+}
+
+}  // namespace pells

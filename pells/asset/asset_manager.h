@@ -1,0 +1,222 @@
+#pragma once
+
+#include <boost/shared_ptr.hpp>
+#include <cstddef>
+#include <cstdint>
+#include <map>
+#include <memory>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "pells/asset/pell_archive.h"
+#include "pells/asset/stream_container.h"
+#include "pells/core/singleton.h"
+
+namespace pells {
+
+class AssetManager;
+extern template class PELLS_API RogueSingleton<AssetManager, SingletonFactory<AssetManager>>;
+extern template class PELLS_API Singleton<AssetManager, SingletonFactory<AssetManager>>;
+
+/// One name space over the plain files below a folder and the members of the archives in it.
+///
+/// The folder, the asset root, is the preference "assetLocation". An asset's name is a path
+/// relative to it, with "/" between levels, compared byte for byte; "\" in a name that is asked for
+/// is read as "/". The manager scans the root once, when it is made by the first instance():
+///
+/// - Every file there whose name ends in ".asset" is opened as a pell archive and stays open. One
+///   that is no good archive is skipped with a line under "error".
+/// - Of several archives that hold a name, the one written last serves it. On equal times, which
+///   are whole seconds, the one that the scan met first does, and the order of the scan is the file
+///   system's: copying archives can change who wins.
+/// - A plain file that was written later than the archive is served instead of the member.
+/// - Files named ".symlinks" declare aliases, see below. Every folder is asked for one, so each
+///   folder without one leaves a line under "error" when that tag is on; that is normal.
+///
+/// Archives and files that come later are only found as plain files. A member whose stored name
+/// holds a "\" is never found.
+///
+/// Aliases. A line "LINK>TARGET" of a folder's ".symlinks" file (an archive member or a plain file)
+/// gives the file or child folder TARGET of that folder a second name there, LINK; below a folder,
+/// everything gets one. Lines that begin with "#" are comments; other lines are reported under
+/// "asset.alias". Nothing is trimmed, so "a > b" names "a " and " b". Folders named "CVS" and
+/// ".svn", folders that links of the file system lead back to, and folders more than 256 levels
+/// down are not searched, and there is a limit on the number of aliases.
+///
+/// The constructor throws boost::filesystem::filesystem_error when the root cannot be listed and
+/// what reading a damaged ".symlinks" member throws; the next instance() tries again. One thread
+/// only.
+class PELLS_API AssetManager : public Singleton<AssetManager, SingletonFactory<AssetManager>> {
+public:
+    class Opener;
+    class FileOpener;
+    class MemberOpener;
+    struct Resolution;
+
+    /// Closes the archives; stream containers on their members must be gone.
+    ~AssetManager() override;
+
+    /// The name with every "\" replaced by "/" and nothing else changed.
+    static std::string fixName(const std::string& name);
+
+    /// Opens an asset: an archive member or a newer plain file by its name or its alias, else the
+    /// plain file of that name below the root.
+    ///
+    /// \param flag handed to the opener, which ignores it.
+    /// \return the container to read from, or null when there is no such asset.
+    /// \throws what reading throws, later: pellibuf::BadPellFile and ZlibWrapper::ZlibError leave
+    ///         the operations of the stream.
+    ///
+    /// All members of one archive share one stream, which opening a member positions anew. This
+    /// goes wrong, both containers read the second member:
+    ///
+    ///     auto first = manager.getFileStream("fonts/large.txt", true);
+    ///     auto second = manager.getFileStream("fonts/small.txt", true);
+    ///     load(first->getStream());
+    ///     load(second->getStream());
+    ///
+    /// Read as far as needed before asking for the next asset:
+    ///
+    ///     auto first = manager.getFileStream("fonts/large.txt", true);
+    ///     load(first->getStream());
+    ///     auto second = manager.getFileStream("fonts/small.txt", true);
+    ///     load(second->getStream());
+    boost::intrusive_ptr<baseiStreamContainer> getFileStream(const std::string& name, bool flag);
+
+    /// Whether an archive has a member of that name or the root a file. Aliases do not count.
+    bool isFile(const std::string& name) const;
+
+    /// Whether an archive has members below that name or the root such a folder. Aliases do not
+    /// count.
+    bool isDir(const std::string& name) const;
+
+    /// The names of the files (`dirs` false) or the folders (`dirs` true) directly inside a folder,
+    /// each once and in no particular order. Aliases do not count.
+    ///
+    /// \param dir the folder's asset name, "" for the root.
+    ///
+    /// Members of archives and what is on disk are listed alike, the archives themselves included.
+    /// A folder that exists nowhere has no names; one that cannot be listed is reported under
+    /// "error", and the names known so far are returned.
+    std::vector<std::string> listfiles(const std::string& dir, bool dirs) const;
+
+    /// Where getFileStream() would take a name from. Opens nothing and logs nothing.
+    Resolution resolve(const std::string& name) const;
+
+    /// The largest number of aliases, 1,000,000 unless it was set. Where the ".symlinks" files
+    /// declare more, the rest is dropped with one line under "error". The text of those files and
+    /// of the names is limited in proportion.
+    static std::size_t getAliasLimit();
+
+    /// Takes effect when the next manager is made.
+    static void setAliasLimit(std::size_t names);
+
+private:
+    friend class SingletonFactory<AssetManager>;
+    typedef std::map<std::string, boost::intrusive_ptr<Opener>> Cache;
+    typedef std::pair<Cache::const_iterator, Cache::const_iterator> CacheRange;
+    struct DirNode;
+    class FolderWalk;
+    class ListingPrefix;
+    class OpeningPrefix;
+
+    AssetManager();
+
+    void scanRoot(const std::string& root);
+    void addArchive(const std::string& path);
+    void cacheMembers(pellistream& archive, std::int32_t timestamp);
+    void preferNewerFiles(const std::string& root);
+    void buildAliases();
+
+    CacheRange getSubdirRange(const std::string& dir) const;
+    std::vector<std::string> listFolder(const std::string& dir, bool dirs, bool onDisk) const;
+    void listCached(const std::string& dir, bool dirs, const ListingPrefix& prefix,
+                    std::vector<std::string>& names) const;
+    void listFileSystem(const std::string& dir, bool dirs, const ListingPrefix& prefix,
+                        std::vector<std::string>& names) const;
+    void describe(const Opener& opener, Resolution& found) const;
+
+    boost::shared_ptr<DirNode> buildDirTree(const std::string& path, const std::string& name,
+                                            const std::string& separator, FolderWalk& walk);
+    void readLinks(DirNode& node, FolderWalk& walk);
+    void buildAliasMap(const boost::shared_ptr<DirNode>& node, const std::string& prefix,
+                       bool linked, FolderWalk& walk);
+    bool addAlias(const std::string& from, const std::string& to, FolderWalk& walk);
+
+    std::vector<std::pair<std::string, std::unique_ptr<pellistream>>> archives;
+    Cache cache;
+    std::map<std::string, std::string> aliases;
+    /// Last-write time of each archive.
+    std::vector<std::int32_t> archiveTimes;
+};
+
+/// Where one asset lies and how it is opened.
+class PELLS_API AssetManager::Opener : public smart_base {
+public:
+    ~Opener() override;
+
+    /// The path of a file, or the name of a member in its archive.
+    const std::string& getName() const { return name; }
+
+    /// When the file or the archive was last written, in seconds since 1970; later times than 32
+    /// bits can tell count as the last one of them. 0 for files that were not looked at.
+    std::int32_t getTimestamp() const { return timestamp; }
+
+    /// Opens the asset; null when that cannot be done. The flag means nothing here.
+    virtual boost::intrusive_ptr<baseiStreamContainer> open(bool flag) = 0;
+
+protected:
+    Opener(std::string sourceName, std::int32_t sourceTimestamp);
+
+private:
+    std::string name;
+    std::int32_t timestamp;
+};
+
+/// Opens a plain file. One that cannot be opened leaves a line under "error".
+class PELLS_API AssetManager::FileOpener : public AssetManager::Opener {
+public:
+    FileOpener(std::string path, std::int32_t writeTime);
+    ~FileOpener() override;
+
+    boost::intrusive_ptr<baseiStreamContainer> open(bool flag) override;
+};
+
+/// Selects a member of an archive, which outlives the opener and its containers.
+class PELLS_API AssetManager::MemberOpener : public AssetManager::Opener {
+public:
+    MemberOpener(std::string member, std::int32_t writeTime, pellistream* openArchive);
+    ~MemberOpener() override;
+
+    const pellistream* getArchive() const { return archive; }
+
+    boost::intrusive_ptr<baseiStreamContainer> open(bool flag) override;
+
+private:
+    pellistream* archive;
+};
+
+/// The answer of AssetManager::resolve().
+struct PELLS_API AssetManager::Resolution {
+    enum Source {
+        NOWHERE,         ///< getFileStream() would return null
+        ARCHIVE_MEMBER,  ///< a member of an archive
+        NEWER_FILE,  ///< a plain file that was newer than the archives when the root was scanned
+        FILE_SYSTEM  ///< a plain file that no archive holds
+    };
+
+    Source source = NOWHERE;
+    /// The archive or the plain file; empty for NOWHERE.
+    std::string path;
+    /// The name in the archive; empty for plain files.
+    std::string member;
+    /// The name that an alias stands for; empty when the name is none.
+    std::string alias;
+    /// The archives that hold the name, too, but do not serve it, in the order of the scan.
+    std::vector<std::string> overridden;
+    /// One of those archives has the same write time, and the order of the scan decided.
+    bool tie = false;
+};
+
+}  // namespace pells

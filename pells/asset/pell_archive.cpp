@@ -1,0 +1,290 @@
+#include "pells/asset/pell_archive.h"
+
+#include <algorithm>
+#include <boost/filesystem/operations.hpp>
+#include <cstring>
+#include <fstream>
+#include <limits>
+#include <locale>
+#include <sstream>
+
+#include "pells/asset/pell_directory.h"
+#include "pells/asset/regular_file.h"
+#include "pells/core/version.h"
+
+namespace pells {
+
+namespace {
+
+const char stamp[] = {'P', 'E', 'L', 'L', 'S', ' '};
+const char terminator[] = {'\r', '\n', '\x1a'};
+
+/// Compressed input is read in blocks of this size.
+const std::uint32_t blockSize = 1024;
+
+/// Compressed input that is read ahead: a little for a reader who takes small pieces; for one who
+/// asks for much, most members as a whole, since every further piece makes zlib copy its window.
+const std::uint32_t smallWindow = 8 * 1024;
+const std::uint32_t largeWindow = 128 * 1024;
+
+const Version& currentVersion() {
+    static const Version version("1.0");
+    return version;
+}
+
+/// The file of an archive, with a buffer so small that seeking to a member and reading it costs no
+/// more than the member's bytes.
+class ArchiveFile : public std::ifstream {
+public:
+    explicit ArchiveFile(const std::string& path) {
+        // Numbers in archives do not follow the user's country.
+        imbue(std::locale::classic());
+        rdbuf()->pubsetbuf(smallBuffer, sizeof smallBuffer);
+        openRegularFile(*this, path);
+    }
+
+private:
+    char smallBuffer[512];
+};
+
+}  // namespace
+
+template <class Stream>
+basic_pellbuf<Stream>::basic_pellbuf(Stream* archiveStream, bool owns)
+    : stream(archiveStream), ownedStream(owns ? archiveStream : nullptr) {}
+
+template <class Stream>
+basic_pellbuf<Stream>::~basic_pellbuf() {
+    delete ownedStream;
+}
+
+template <class Stream>
+typename basic_pellbuf<Stream>::const_iterator basic_pellbuf<Stream>::begin() const {
+    return const_iterator(directory.begin(), NameOf());
+}
+
+template <class Stream>
+typename basic_pellbuf<Stream>::const_iterator basic_pellbuf<Stream>::end() const {
+    return const_iterator(directory.end(), NameOf());
+}
+
+template <class Stream>
+const typename basic_pellbuf<Stream>::Directory& basic_pellbuf<Stream>::getDirectory() const {
+    return directory;
+}
+
+template <class Stream>
+const std::string& basic_pellbuf<Stream>::getMemberName() const {
+    return memberName;
+}
+
+template <class C, class Traits>
+basic_pellibuf<C, Traits>::BadPellFile::BadPellFile(const std::string& message)
+    : std::runtime_error(message) {}
+
+template <class C, class Traits>
+basic_pellibuf<C, Traits>::BadPellFile::~BadPellFile() = default;
+
+template <class C, class Traits>
+basic_pellibuf<C, Traits>::basic_pellibuf(const std::string& path)
+    : simple_istreambuf<C, Traits>(1024),
+      basic_pellbuf<std::istream>(new ArchiveFile(path), true),
+      inflater(nullptr, 0, 15, nullptr, nullptr, nullptr),
+      remaining(0),
+      ahead(nullptr),
+      aheadCount(0) {
+    static_assert(sizeof(C) == 1 && sizeof inputBuffer == blockSize, "members are bytes");
+    if (stream->fail())
+        throw BadPellFile("Can't open pell file");
+    readHeader();
+    readPellDirectory(*stream, directory);
+}
+
+template <class C, class Traits>
+basic_pellibuf<C, Traits>::~basic_pellibuf() noexcept = default;
+
+template <class C, class Traits>
+void basic_pellibuf<C, Traits>::readHeader() {
+    stream->seekg(0);
+    if (!stream->read(inputBuffer, sizeof stamp))
+        throw BadPellFile("Pell file too short for stamp");
+    if (std::memcmp(inputBuffer, stamp, sizeof stamp) != 0)
+        throw BadPellFile("Input file not a pell file");
+
+    std::uint32_t directoryOffset = 0;
+    char versionMark = 0;
+    int majorNumber = 0;
+    char dot = 0;
+    int minorNumber = 0;
+    *stream >> std::hex >> directoryOffset >> std::dec;
+    *stream >> versionMark >> majorNumber >> dot >> minorNumber;
+    if (!*stream)
+        throw BadPellFile("Cannot read pell file header");
+    bool formatIsGood = versionMark == 'v' && dot == '.';
+    for (const char expected : terminator)
+        formatIsGood = formatIsGood && stream->get() == static_cast<unsigned char>(expected);
+    if (!formatIsGood)
+        throw BadPellFile("Bad pell file header format");
+
+    std::ostringstream message;
+    message.imbue(std::locale::classic());
+    if (majorNumber != currentVersion().getMajor()) {
+        message << "Bad pell file version " << majorNumber << '.' << minorNumber
+                << ", current version is " << currentVersion();
+        throw BadPellFile(message.str());
+    }
+    if (!stream->seekg(static_cast<std::streamoff>(directoryOffset))) {
+        message << "Bad pell file directory offset " << std::hex << directoryOffset;
+        throw BadPellFile(message.str());
+    }
+}
+
+template <class C, class Traits>
+bool basic_pellibuf<C, Traits>::open(const std::string& member) {
+    Directory::const_iterator entry = directory.find(member);
+    if (entry == directory.end()) {
+        std::string converted = member;
+        std::replace(converted.begin(), converted.end(), '\\', '/');
+        entry = directory.find(converted);
+    }
+    if (entry == directory.end()) {
+        memberName.clear();
+        return false;
+    }
+    memberName = member;
+    stream->clear();
+    stream->seekg(entry->second.offset);
+    remaining = entry->second.length;
+    aheadCount = 0;
+    C* const start = this->buffer();
+    this->setg(start, start, start);
+    inflateReset(&inflater);
+    inflater.next_in = nullptr;
+    inflater.avail_in = 0;
+    return true;
+}
+
+template <class C, class Traits>
+long basic_pellibuf<C, Traits>::read(C* into, long room) {
+    if (room <= 0)
+        return 0;
+    // Small reads take the input in small pieces, so that whatever comes before a damaged place
+    // reaches the reader; large ones give zlib all it can use at once.
+    const bool wide = room > this->bufferSize();
+    const uInt space = static_cast<uInt>(std::min<long>(room, std::numeric_limits<int>::max()));
+    inflater.next_out = reinterpret_cast<Bytef*>(into);
+    inflater.avail_out = space;
+    int result = Z_STREAM_END;
+    do {
+        if (inflater.avail_in == 0 && !refill(wide)) {
+            result = Z_STREAM_END;
+            break;
+        }
+        result = inflate(&inflater, Z_NO_FLUSH);
+    } while ((result == Z_OK || result == Z_BUF_ERROR) && inflater.avail_out == space);
+    if (result != Z_STREAM_END && result != Z_OK) {
+        inflater.check("read(): bad pell data stream for member '" + memberName + "'", result,
+                       Z_STREAM_END, Z_OK);
+    }
+    return static_cast<long>(space - inflater.avail_out);
+}
+
+template <class C, class Traits>
+std::streamsize basic_pellibuf<C, Traits>::xsgetn(C* to, std::streamsize count) {
+    std::streamsize done = std::min<std::streamsize>(count, this->egptr() - this->gptr());
+    Traits::copy(to, this->gptr(), static_cast<std::size_t>(done));
+    this->gbump(static_cast<int>(done));
+    while (count - done > this->bufferSize()) {
+        const std::streamsize most = std::numeric_limits<long>::max();
+        const long got = read(to + done, static_cast<long>(std::min(count - done, most)));
+        if (got <= 0)
+            return done;
+        done += got;
+        // The last character consumed can be put back.
+        C* const start = this->buffer();
+        *start = to[done - 1];
+        this->setg(start, start + 1, start + 1);
+    }
+    return done + simple_istreambuf<C, Traits>::xsgetn(to + done, count - done);
+}
+
+/// Gives the inflater input; false when the member has no more.
+template <class C, class Traits>
+bool basic_pellibuf<C, Traits>::refill(bool wide) {
+    if (aheadCount == 0) {
+        if (remaining == 0)
+            return false;
+        fetch(wide);
+    }
+    const std::uint32_t given = wide ? aheadCount : std::min(aheadCount, blockSize);
+    inflater.next_in = reinterpret_cast<Bytef*>(const_cast<char*>(ahead));
+    inflater.avail_in = given;
+    ahead += given;
+    aheadCount -= given;
+    return true;
+}
+
+/// Reads the next stored bytes of the member.
+template <class C, class Traits>
+void basic_pellibuf<C, Traits>::fetch(bool wide) {
+    const std::uint32_t wanted = std::min(remaining, wide ? largeWindow : smallWindow);
+    if (wanted > window.size() && wanted > blockSize)
+        window.resize(wanted);
+    char* const into = wanted > blockSize ? window.data() : inputBuffer;
+    stream->read(into, static_cast<std::streamsize>(wanted));
+    std::uint32_t got = static_cast<std::uint32_t>(stream->gcount());
+    if (got < wanted) {
+        // The file ends here. The whole blocks before its end are served, as if they had been read
+        // one by one; the next attempt finds the stream failed and nothing to serve.
+        got -= got % blockSize;
+        if (got == 0)
+            throw BadPellFile("Can't read pell data stream for member '" + memberName + "'");
+    }
+    remaining -= got;
+    ahead = into;
+    aheadCount = got;
+}
+
+template class basic_pellbuf<std::istream>;
+template class basic_pellibuf<char>;
+template class simple_istream<char, std::char_traits<char>, basic_pellibuf<char>>;
+
+template <class C, class Traits>
+basic_pellistream<C, Traits>::basic_pellistream(const std::string& path)
+    : simple_istream<C, Traits, Buffer>(new Buffer(path)) {
+    this->exceptions(std::ios_base::badbit);
+}
+
+template <class C, class Traits>
+basic_pellistream<C, Traits>::~basic_pellistream() = default;
+
+template <class C, class Traits>
+bool basic_pellistream<C, Traits>::open(const std::string& member) {
+    this->clear();
+    return this->ownBuffer().open(member);
+}
+
+template <class C, class Traits>
+typename basic_pellistream<C, Traits>::const_iterator basic_pellistream<C, Traits>::begin() const {
+    return this->ownBuffer().begin();
+}
+
+template <class C, class Traits>
+typename basic_pellistream<C, Traits>::const_iterator basic_pellistream<C, Traits>::end() const {
+    return this->ownBuffer().end();
+}
+
+template <class C, class Traits>
+const typename basic_pellistream<C, Traits>::Directory& basic_pellistream<C, Traits>::getDirectory()
+    const {
+    return this->ownBuffer().getDirectory();
+}
+
+template <class C, class Traits>
+const std::string& basic_pellistream<C, Traits>::getMemberName() const {
+    return this->ownBuffer().getMemberName();
+}
+
+template class basic_pellistream<char>;
+
+}  // namespace pells

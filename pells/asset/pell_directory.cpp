@@ -1,0 +1,163 @@
+#include "pells/asset/pell_directory.h"
+
+#include <cstring>
+#include <iterator>
+#include <utility>
+
+namespace pells {
+
+namespace {
+
+typedef basic_pellbuf<std::istream>::Directory Directory;
+typedef basic_pellbuf<std::istream>::Entry Entry;
+
+const int endOfFile = -1;
+const int endMark = 0x1A;
+
+/// The white space of the classic locale.
+bool isSpace(char c) {
+    return c == ' ' || (c >= '\t' && c <= '\r');
+}
+
+/// Digits only: what stream extraction would take beside them (a sign, "0x") is no number here.
+bool parseHexadecimal(const std::string& text, std::uint32_t& value) {
+    value = 0;
+    for (const char c : text) {
+        std::uint32_t digit = 0;
+        if (c >= '0' && c <= '9')
+            digit = static_cast<std::uint32_t>(c - '0');
+        else if (c >= 'a' && c <= 'f')
+            digit = static_cast<std::uint32_t>(c - 'a') + 10;
+        else if (c >= 'A' && c <= 'F')
+            digit = static_cast<std::uint32_t>(c - 'A') + 10;
+        else
+            return false;
+        if (value >> 28 != 0)
+            return false;
+        value = value << 4 | digit;
+    }
+    return true;
+}
+
+class DirectoryScanner {
+public:
+    explicit DirectoryScanner(std::istream& archiveStream)
+        : stream(archiveStream), next(block), end(block) {}
+
+    void readInto(Directory& directory) {
+        // Writers mostly list names in order; then each entry goes right behind the last one.
+        Directory::iterator place = directory.end();
+        int c = get();
+        while (c != endOfFile && c != endMark) {
+            c = readEntry(c);
+            const Entry entry = {number('O', offsetText), number('L', lengthText)};
+            place = std::next(directory.insert_or_assign(place, std::move(name), entry));
+        }
+    }
+
+private:
+    /// Reads the entry that begins with c, and one character more, which it returns.
+    int readEntry(int c) {
+        offsetText.clear();
+        lengthText.clear();
+        name.clear();
+        while (c != endOfFile && c != endMark && c != '|') {
+            std::string& text = c == 'O' ? offsetText : c == 'L' ? lengthText : ignoredText;
+            if (!readWord(text))
+                throw pellibuf::BadPellFile("Cannot read pell file directory entry");
+            c = get();
+            if (c == ' ')
+                c = get();
+        }
+        if (c == '|') {
+            readName();
+            c = get();
+        }
+        return c;
+    }
+
+    void readName() {
+        if (!readLine(name))
+            throw pellibuf::BadPellFile("Cannot read pell file member name");
+        if (name.empty() || name.back() != '\r')
+            throw pellibuf::BadPellFile("Bad pell file member name");
+        name.pop_back();
+    }
+
+    std::uint32_t number(char code, const std::string& text) const {
+        // A word that was read is never empty.
+        if (text.empty())
+            throw pellibuf::BadPellFile(inEntry() + "missing field '" + code + "'");
+        std::uint32_t value = 0;
+        if (!parseHexadecimal(text, value))
+            throw pellibuf::BadPellFile(inEntry() + "bad field '" + code + "': '" + text + "'");
+        return value;
+    }
+
+    std::string inEntry() const { return "Pell file directory entry '" + name + "': "; }
+
+    int get() {
+        if (next == end && !refill())
+            return endOfFile;
+        return static_cast<unsigned char>(*next++);
+    }
+
+    /// The run of characters up to the next white space, after skipping white space; false when the
+    /// file ends before it.
+    bool readWord(std::string& word) {
+        do {
+            while (next != end && isSpace(*next))
+                ++next;
+        } while (next == end && refill());
+        word.clear();
+        while (next != end) {
+            const char* const start = next;
+            while (next != end && !isSpace(*next))
+                ++next;
+            word.append(start, next);
+            if (next != end || !refill())
+                break;
+        }
+        return !word.empty();
+    }
+
+    /// The characters up to the next line feed, which is taken, too; false when the file ends
+    /// before the first.
+    bool readLine(std::string& line) {
+        if (next == end && !refill())
+            return false;
+        do {
+            const void* const found = std::memchr(next, '\n', static_cast<std::size_t>(end - next));
+            const char* const stop = found ? static_cast<const char*>(found) : end;
+            line.append(next, stop);
+            next = found ? stop + 1 : stop;
+            if (found)
+                break;
+        } while (refill());
+        return true;
+    }
+
+    bool refill() {
+        stream.read(block, sizeof block);
+        next = block;
+        end = block + stream.gcount();
+        return next != end;
+    }
+
+    std::istream& stream;
+    const char* next;
+    const char* end;
+    std::string offsetText;
+    std::string lengthText;
+    std::string ignoredText;
+    std::string name;
+    char block[16384];
+};
+
+}  // namespace
+
+void readPellDirectory(std::istream& stream, Directory& directory) {
+    DirectoryScanner(stream).readInto(directory);
+}
+
+}  // namespace pells

@@ -1,0 +1,32 @@
+#include "pells/asset/stream_container.h"
+
+#include "pells/asset/regular_file.h"
+
+namespace pells {
+
+baseiStreamContainer::~baseiStreamContainer() = default;
+
+iTemporaryStreamContainer::CantOpen::~CantOpen() = default;
+
+iTemporaryStreamContainer::iTemporaryStreamContainer(const std::string& path) {
+    openRegularFile(file, path);
+    if (!file.is_open())
+        throw CantOpen();
+}
+
+iTemporaryStreamContainer::~iTemporaryStreamContainer() = default;
+
+std::istream& iTemporaryStreamContainer::getStream() {
+    return file;
+}
+
+iExistingStreamContainer::iExistingStreamContainer(std::istream& existingStream)
+    : stream(&existingStream) {}
+
+iExistingStreamContainer::~iExistingStreamContainer() = default;
+
+std::istream& iExistingStreamContainer::getStream() {
+    return *stream;
+}
+
+}  // namespace pells

@@ -1,0 +1,7 @@
+#include "pells/serial/enum.h"
+
+namespace pells {
+
+BadEnum::~BadEnum() = default;
+
+}  // namespace pells

@@ -1,0 +1,92 @@
+#pragma once
+
+#include <boost/smart_ptr/intrusive_ptr.hpp>
+#include <string>
+#include <vector>
+
+#include "pells/undo/undoable_step.h"
+
+namespace pells {
+
+/// The history of what the user did: steps that are done and, above them, steps that were undone.
+///
+/// Recording a new step discards the undone ones. Copies of a history share its steps; destroying a
+/// history only lets go of them. Pointers passed in are not null. One thread only.
+class PELLS_API UndoRedoSequence : public Serializable {
+public:
+    /// An operation of the caller's on one step.
+    class PELLS_API BatchMethod {
+    public:
+        virtual ~BatchMethod();
+        virtual bool operator()(boost::intrusive_ptr<UndoableStep> step) const = 0;
+    };
+
+    UndoRedoSequence();
+    UndoRedoSequence(const UndoRedoSequence&);
+    UndoRedoSequence& operator=(const UndoRedoSequence&);
+    ~UndoRedoSequence() override;
+
+    /// Records a step that has just been done; the redo stack is discarded.
+    void addUndoable(boost::intrusive_ptr<UndoableStep> step);
+
+    /// Records a step as undone, to be redone after all that wait already.
+    void addRedoable(boost::intrusive_ptr<UndoableStep> step);
+
+    /// Undoes the last step that is done. False when there is none, or when the step's undo()
+    /// fails: then the step stays done.
+    bool undo();
+
+    /// Redoes the next undone step. False when there is none, or when the step's redo() fails; the
+    /// step counts as done even so. A step whose redo is suppressed counts as done without a call.
+    bool redo();
+
+    /// The last step that is done, or null.
+    boost::intrusive_ptr<UndoableStep> getLast() const;
+
+    int getUndoStackSize() const;
+    int getRedoStackSize() const;
+
+    /// Discards the undone steps after calling destroy() on each, the next to redo first.
+    void clearRedoStack();
+
+    /// Discards everything; only undone steps receive destroy().
+    void clear();
+
+    /// Discards this history's undone steps and appends the done steps of another one, after
+    /// calling updateId(ids) on each. The other's undone steps receive destroy(); it is left empty.
+    /// Merging a history with itself does nothing.
+    void merge(UndoRedoSequence* other, const IdHandler& ids);
+
+    /// Removes the first step that the method selects, without destroy(). \return whether one was.
+    bool removeIf(const BatchMethod& method);
+
+    /// Calls the method on the done steps, oldest first or (forward false) newest first, until it
+    /// returns false. \return whether all calls returned true.
+    bool applyToUndo(const BatchMethod& method, bool forward) const;
+
+    /// The same for all steps.
+    bool applyToAll(const BatchMethod& method, bool forward) const;
+
+    /// Writes the steps that are done and valid. A history with nothing done writes nothing at all,
+    /// not even its element.
+    void save(OutTag& tag) override;
+
+    /// Reads steps and appends them to those that the history holds; each one replays itself as it
+    /// is read, and counts as done. Invalid steps receive destroy() and are dropped.
+    ///
+    /// What fails in a step or in the document (Serializable::LoadFail) passes through; the history
+    /// then holds what it held and the steps that were read in whole.
+    void load(InTag& tag, boost::intrusive_ptr<Field> field) override;
+    boost::intrusive_ptr<Field> getField(const std::string& name) override;
+
+private:
+    typedef std::vector<boost::intrusive_ptr<UndoableStep>> Steps;
+
+    bool apply(const BatchMethod& method, int count, bool forward) const;
+    void acceptLoadedSteps();
+
+    Steps steps;
+    int current;
+};
+
+}  // namespace pells

@@ -1,0 +1,52 @@
+#pragma once
+
+#include <zlib.h>
+
+#include <cstdio>
+#include <string>
+#include <utility>
+#include <vector>
+
+namespace pells_test {
+
+/// A zlib stream of the bytes.
+inline std::string deflated(const std::string& bytes) {
+    uLongf size = compressBound(static_cast<uLong>(bytes.size()));
+    std::string stream(size, '\0');
+    compress(reinterpret_cast<Bytef*>(&stream[0]), &size,
+             reinterpret_cast<const Bytef*>(bytes.data()), static_cast<uLong>(bytes.size()));
+    stream.resize(size);
+    return stream;
+}
+
+inline std::string hexadecimal(std::size_t number) {
+    char digits[20];
+    std::snprintf(digits, sizeof digits, "%zx", number);
+    return digits;
+}
+
+const std::size_t archiveHeaderSize = 21;
+
+/// An archive of some data, which begins at archiveHeaderSize, and a directory as it is given.
+inline std::string archiveWithDirectory(const std::string& directory,
+                                        const std::string& data = std::string()) {
+    char header[archiveHeaderSize + 1];
+    std::snprintf(header, sizeof header, "PELLS %08zxv1.0\r\n\x1a",
+                  archiveHeaderSize + data.size());
+    return header + data + directory;
+}
+
+/// An archive of members with these names and contents.
+inline std::string archiveOf(const std::vector<std::pair<std::string, std::string>>& members) {
+    std::string data;
+    std::string directory;
+    for (const auto& member : members) {
+        const std::string stream = deflated(member.second);
+        directory += "O" + hexadecimal(archiveHeaderSize + data.size()) + " L" +
+                     hexadecimal(stream.size()) + " |" + member.first + "\r\n";
+        data += stream;
+    }
+    return archiveWithDirectory(directory, data);
+}
+
+}  // namespace pells_test

@@ -1,0 +1,36 @@
+#include <CLI/CLI.hpp>
+#include <iomanip>
+#include <memory>
+#include <sstream>
+#include <string>
+
+#include "tools/commands.h"
+#include "tools/open_archive.h"
+#include "tools/standard_output.h"
+#include "tools/text.h"
+
+namespace pells_tool {
+
+namespace {
+
+void list(const std::string& file) {
+    const auto archive = openArchive(file);
+    for (const auto& member : archive->getDirectory()) {
+        std::ostringstream line;
+        line << std::setw(10) << member.second.length << "  " << printable(member.first) << '\n';
+        writeOut(line.str());
+    }
+}
+
+}  // namespace
+
+void addList(CLI::App& app) {
+    const auto file = std::make_shared<std::string>();
+    CLI::App* const command =
+        app.add_subcommand("list", "Show the members of an archive, one a line");
+    command->add_option("FILE", *file, "The archive")->required()->type_name("");
+    command->footer("Each line has the stored (compressed) size in bytes and the name.");
+    command->callback([file] { list(*file); });
+}
+
+}  // namespace pells_tool
