@@ -2,6 +2,10 @@
 
 #include <gtest/gtest.h>
 
+#include <cmath>
+#include <tuple>
+#include <utility>
+
 namespace {
 
 using pells::Color;
@@ -22,74 +26,65 @@ TEST(PackedColors, ConvertWithTruncation) {
     EXPECT_EQ(hsv2rgb(0xFFFFFFFF), 0xFFFFFFU) << "a hue of 4095 degrees";
 }
 
-struct Conversion {
-    Color rgb;
+/// A colour in the first three members, as HSVInterpolate() returns it.
+Color toHsv(const Color& rgb) {
     Color hsv;
-};
+    pells::RGBtoHSV(rgb.r, rgb.g, rgb.b, hsv.r, hsv.g, hsv.b);
+    return hsv;
+}
+
+Color toRgb(const Color& hsv) {
+    Color rgb;
+    pells::HSVtoRGB(hsv.r, hsv.g, hsv.b, rgb.r, rgb.g, rgb.b);
+    return rgb;
+}
+
+void expectNear(const Color& color, const Color& expected) {
+    EXPECT_FLOAT_EQ(color.r, expected.r);
+    EXPECT_FLOAT_EQ(color.g, expected.g);
+    EXPECT_FLOAT_EQ(color.b, expected.b);
+}
 
 TEST(Colors, ConvertBothWays) {
-    const Conversion conversions[] = {
+    const std::pair<Color, Color> conversions[] = {
         {{0.5F, 0.5F, 0.5F, 0}, {0, 0, 0.5F, 0}}, {{0, 0, 0, 0}, {0, 0, 0, 0}},
         {{1, 0.5F, 0, 0}, {30, 1, 1, 0}},         {{0.25F, 0.5F, 0, 0}, {90, 1, 0.5F, 0}},
         {{0, 1, 0.5F, 0}, {150, 1, 1, 0}},        {{0.5F, 0.75F, 1, 0}, {210, 0.5F, 1, 0}},
         {{0.25F, 0, 0.5F, 0}, {270, 1, 0.5F, 0}}, {{1, 0, 0.5F, 0}, {330, 1, 1, 0}},
     };
-    for (const Conversion& each : conversions) {
-        float h = -1;
-        float s = -1;
-        float v = -1;
-        pells::RGBtoHSV(each.rgb.r, each.rgb.g, each.rgb.b, h, s, v);
-        EXPECT_FLOAT_EQ(h, each.hsv.r);
-        EXPECT_FLOAT_EQ(s, each.hsv.g);
-        EXPECT_FLOAT_EQ(v, each.hsv.b);
-
-        float r = -1;
-        float g = -1;
-        float b = -1;
-        pells::HSVtoRGB(h, s, v, r, g, b);
-        EXPECT_FLOAT_EQ(r, each.rgb.r);
-        EXPECT_FLOAT_EQ(g, each.rgb.g);
-        EXPECT_FLOAT_EQ(b, each.rgb.b);
+    for (const auto& each : conversions) {
+        expectNear(toHsv(each.first), each.second);
+        expectNear(toRgb(each.second), each.first);
     }
-}
-
-TEST(Colors, OfHuesOffTheCircleAreWhite) {
-    for (const float hue : {-60.0F, 360.5F, 1e30F, -1e30F}) {
-        float r = -1;
-        float g = -1;
-        float b = -1;
-        pells::HSVtoRGB(hue, 0.5F, 0.5F, r, g, b);
-        EXPECT_EQ(r + g + b, 3) << hue;
-        pells::HSVtoRGB(hue, 0, 0.5F, r, g, b);
-        EXPECT_EQ(r + g + b, 1.5F) << hue;
+    for (const float hue : {-60.0F, 360.5F, 1e30F, -1e30F, std::nanf("")}) {
+        expectNear(toRgb({hue, 0.5F, 0.5F, 0}), {1, 1, 1, 0});
+        expectNear(toRgb({hue, 0, 0.5F, 0}), {0.5F, 0.5F, 0.5F, 0});
     }
 }
 
 struct Blend {
-    float from[3];
-    float to[3];
+    Color from;
+    Color to;
     double t;
     Color expected;
 };
 
 TEST(Blending, TakesTheShortWayAndFollowsTheStrongerColor) {
     const Blend blends[] = {
-        {{0, 1, 1}, {120, 1, 1}, 0.5, {60, 1, 1, 0}},
-        {{350, 1, 1}, {10, 1, 1}, 0.5, {360, 1, 1, 0}},
-        {{10, 1, 1}, {350, 1, 1}, 0.75, {355, 1, 1, 0}},
-        {{0, 1, 1}, {240, 0.5F, 1}, 0.5, {320, 0.75F, 1, 0}},
-        {{200, 0, 1}, {60, 1, 1}, 0.25, {60, 0.25F, 1, 0}},
-        {{200, 1, 1}, {60, 0, 1}, 0.25, {200, 0.75F, 1, 0}},
-        {{200, 0, 1}, {60, 0, 0}, 0.5, {60, 0, 0.5F, 0}},
-        {{0, 1, 0}, {0, 1, 0}, 0.5, {0, 0, 0, 0}},
+        {{0, 1, 1, 0}, {120, 1, 1, 0}, 0.5, {60, 1, 1, 0}},
+        {{350, 1, 1, 0}, {10, 1, 1, 0}, 0.5, {360, 1, 1, 0}},
+        {{10, 1, 1, 0}, {350, 1, 1, 0}, 0.75, {355, 1, 1, 0}},
+        {{0, 1, 1, 0}, {240, 0.5F, 1, 0}, 0.5, {320, 0.75F, 1, 0}},
+        {{200, 0, 1, 0}, {60, 1, 1, 0}, 0.25, {60, 0.25F, 1, 0}},
+        {{200, 1, 1, 0}, {60, 0, 1, 0}, 0.25, {200, 0.75F, 1, 0}},
+        {{200, 0, 1, 0}, {60, 0, 0, 0}, 0.5, {60, 0, 0.5F, 0}},
+        {{0, 1, 0, 0}, {0, 1, 0, 0}, 0.5, {0, 0, 0, 0}},
     };
     for (const Blend& each : blends) {
-        const Color hsv = HSVInterpolate(each.from[0], each.from[1], each.from[2], each.to[0],
-                                         each.to[1], each.to[2], each.t);
-        EXPECT_EQ(hsv.r, each.expected.r) << each.from[0] << " to " << each.to[0];
-        EXPECT_EQ(hsv.g, each.expected.g) << each.from[0] << " to " << each.to[0];
-        EXPECT_EQ(hsv.b, each.expected.b) << each.from[0] << " to " << each.to[0];
-        EXPECT_EQ(hsv.a, 0);
+        const Color hsv = HSVInterpolate(each.from.r, each.from.g, each.from.b, each.to.r,
+                                         each.to.g, each.to.b, each.t);
+        const Color& want = each.expected;
+        EXPECT_EQ(std::tie(hsv.r, hsv.g, hsv.b, hsv.a), std::tie(want.r, want.g, want.b, want.a));
     }
 }
 

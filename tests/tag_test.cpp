@@ -62,13 +62,13 @@ TEST(Attributes, AreVisitedLikeTheChainsOfAHashTable) {
 TEST(Attributes, OfATokenKeepTheLastOfEqualNames) {
     Pairs list = {{"x", "1"}, {"y", "2"}, {"x", "3"}};
     AttrMap attrs;
-    attrs.assign(list);
+    attrs.assign(Pairs(list));
     EXPECT_EQ(Pairs(attrs.begin(), attrs.end()), (Pairs{{"x", "3"}, {"y", "2"}}));
 
     list.clear();
     for (int i = 0; i < 200000; ++i)
         list.emplace_back("n" + std::to_string(i % 150000), std::to_string(i));
-    attrs.assign(list);
+    attrs.assign(std::move(list));
     EXPECT_EQ(attrs.size(), 150000u);
     EXPECT_EQ(*attrs.find("n7"), "150007");
     EXPECT_EQ(*attrs.find("n50000"), "50000");

@@ -98,7 +98,7 @@ std::string shown(const std::string& file, int width, int height, int depth, boo
             const std::string pixel =
                 file.substr(18 + static_cast<std::size_t>(row * width + x) * step, step);
             if (step == 1)
-                rows += pixel + pixel + pixel;
+                rows.append(3, pixel[0]);
             else
                 rows += {pixel[2], pixel[1], pixel[0]};
             if (step == 4)
@@ -209,7 +209,7 @@ TEST_F(Tga, SurvivesEveryCutAndEveryFlippedBitOfItsHeader) {
             EXPECT_FALSE(load(file.substr(0, size))) << size;
             EXPECT_FALSE(image.isValid()) << size;
         }
-        for (std::size_t bit = 0; bit < 18 * 8; ++bit) {
+        for (std::size_t bit = 0; bit < 144; ++bit) {
             std::string flipped = file;
             flipped[bit / 8] = static_cast<char>(flipped[bit / 8] ^ (1 << bit % 8));
             const bool loaded = load(flipped);

@@ -60,7 +60,7 @@ protected:
 
 TEST_F(TokenizerReference, AgreesOnWellFormedDocuments) {
     XmlGenerator generator(1);
-    for (int left = 40000; left > 0 && !HasFailure(); --left) {
+    for (int left = 30000; left > 0 && !HasFailure(); --left) {
         const std::string text = generator.document();
         compare(text + "<end/>");
         ASSERT_EQ(expected.rbegin()[1].value, "end") << "outside the dialect: " << text;
@@ -69,7 +69,7 @@ TEST_F(TokenizerReference, AgreesOnWellFormedDocuments) {
 
 TEST_F(TokenizerReference, AgreesOnDamagedDocuments) {
     XmlGenerator generator(2);
-    for (int left = 60000; left > 0 && !HasFailure(); --left)
+    for (int left = 50000; left > 0 && !HasFailure(); --left)
         compare(generator.mutated(generator.document()));
 }
 

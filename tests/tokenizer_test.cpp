@@ -88,7 +88,8 @@ INSTANTIATE_TEST_SUITE_P(
         nothing("SpaceInEmptyTag", "<a/ >"), nothing("AttributeOfEndTag", "</t a='1'>"),
         nothing("NoDigits", "&#;"), nothing("CapitalX", "&#X41;"), nothing("NoSemicolon", "&lt "),
         nothing("TwoHyphens", "<!-- a -- b -->"), nothing("ThreeHyphens", "<!-- a --->"),
-        nothing("ControlInComment", "<!-- \x01 -->"), nothing("ControlBehindHyphen", "<!---\v-->")),
+        nothing("ControlInComment", "<!-- a control character far inside \x01 -->"),
+        nothing("ControlBehindHyphen", "<!---\v-->")),
     [](const auto& each) { return std::string(each.param.name); });
 
 }  // namespace

@@ -16,7 +16,7 @@ voidpf refuse(voidpf /*data*/, uInt /*items*/, uInt /*size*/) {
 /// Hands out memory of its own, so that a stream that zlib can no longer end leaks nothing.
 voidpf takeFromArena(voidpf arena, uInt items, uInt size) {
     std::string& bytes = *static_cast<std::string*>(arena);
-    return items * size <= bytes.size() ? &bytes[0] : nullptr;
+    return std::size_t{items} * size <= bytes.size() ? &bytes[0] : nullptr;
 }
 
 void leaveInArena(voidpf /*arena*/, voidpf /*memory*/) {}

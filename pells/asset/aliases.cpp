@@ -162,7 +162,7 @@ private:
     /// A multiple of the limit, for its kind of text.
     std::uint64_t inProportion(std::uint64_t bytesPerAlias) const {
         const std::uint64_t most = std::numeric_limits<std::uint32_t>::max();
-        return std::min<std::uint64_t>(limit, most) * bytesPerAlias + 1024 * 1024;
+        return std::min<std::uint64_t>(limit, most) * bytesPerAlias + (std::uint64_t{1} << 20);
     }
 
     std::vector<Folder> chain;
@@ -191,7 +191,7 @@ boost::shared_ptr<AssetManager::DirNode> AssetManager::buildDirTree(const std::s
                                                                     const std::string& separator,
                                                                     FolderWalk& walk) {
     PELLS_LOG("asset.alias", "Making new DirNode for '" << path << "'");
-    const auto node = boost::make_shared<DirNode>();
+    auto node = boost::make_shared<DirNode>();
     node->path = path;
     node->name = name;
     node->separator = separator;

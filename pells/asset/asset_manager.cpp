@@ -285,6 +285,7 @@ void AssetManager::listFileSystem(const std::string& dir, bool dirs, const Listi
     if (!isNativeName(dir))
         return;
     const fs::path folder = assetPath(dir);
+    const std::string start = dir.empty() ? dir : dir + '/';
     boost::system::error_code error;
     for (fs::directory_iterator entry(folder, error), end; !error && entry != end;
          entry.increment(error)) {
@@ -292,7 +293,7 @@ void AssetManager::listFileSystem(const std::string& dir, bool dirs, const Listi
             continue;
         const std::string name = entry->path().filename().string();
         PELLS_LOG("asset.list", prefix << "from filesystem: " << name);
-        const std::string key = dir.empty() ? name : dir + '/' + name;
+        const std::string key = start + name;
         const CacheRange below = dirs ? getSubdirRange(key) : CacheRange();
         if (dirs ? below.first == below.second : cache.count(key) == 0)
             names.push_back(name);

@@ -6,7 +6,6 @@
 #include <fstream>
 #include <limits>
 #include <locale>
-#include <memory>
 #include <sstream>
 
 #include "pells/asset/pell_directory.h"
@@ -23,22 +22,30 @@ const char terminator[] = {'\r', '\n', '\x1a'};
 /// Compressed input is read in blocks of this size.
 const std::uint32_t blockSize = 1024;
 
-/// Compressed input that is read ahead for a reader who asks for much at once. Room for most
-/// members as a whole, since every further piece makes zlib copy its window.
-const std::uint32_t windowSize = 128 * 1024;
+/// Compressed input that is read ahead: a little for a reader who takes small pieces; for one who
+/// asks for much, most members as a whole, since every further piece makes zlib copy its window.
+const std::uint32_t smallWindow = 8 * 1024;
+const std::uint32_t largeWindow = 128 * 1024;
 
 const Version& currentVersion() {
     static const Version version("1.0");
     return version;
 }
 
-std::istream* openArchive(const std::string& path) {
-    std::unique_ptr<std::ifstream> file(new std::ifstream);
-    // Numbers in archives do not follow the user's country.
-    file->imbue(std::locale::classic());
-    openRegularFile(*file, path);
-    return file.release();
-}
+/// The file of an archive, with a buffer so small that seeking to a member and reading it costs no
+/// more than the member's bytes.
+class ArchiveFile : public std::ifstream {
+public:
+    explicit ArchiveFile(const std::string& path) {
+        // Numbers in archives do not follow the user's country.
+        imbue(std::locale::classic());
+        rdbuf()->pubsetbuf(smallBuffer, sizeof smallBuffer);
+        openRegularFile(*this, path);
+    }
+
+private:
+    char smallBuffer[512];
+};
 
 }  // namespace
 
@@ -81,7 +88,7 @@ basic_pellibuf<C, Traits>::BadPellFile::~BadPellFile() = default;
 template <class C, class Traits>
 basic_pellibuf<C, Traits>::basic_pellibuf(const std::string& path)
     : simple_istreambuf<C, Traits>(1024),
-      basic_pellbuf<std::istream>(openArchive(path), true),
+      basic_pellbuf<std::istream>(new ArchiveFile(path), true),
       inflater(nullptr, 0, 15, nullptr, nullptr, nullptr),
       remaining(0),
       ahead(nullptr),
@@ -220,7 +227,7 @@ bool basic_pellibuf<C, Traits>::refill(bool wide) {
 /// Reads the next stored bytes of the member.
 template <class C, class Traits>
 void basic_pellibuf<C, Traits>::fetch(bool wide) {
-    const std::uint32_t wanted = std::min(remaining, wide ? windowSize : blockSize);
+    const std::uint32_t wanted = std::min(remaining, wide ? largeWindow : smallWindow);
     if (wanted > window.size() && wanted > blockSize)
         window.resize(wanted);
     char* const into = wanted > blockSize ? window.data() : inputBuffer;

@@ -2,6 +2,7 @@
 
 #include <exception>
 #include <istream>
+#include <utility>
 
 #include "pells/asset/asset_manager.h"
 #include "pells/asset/pell_archive.h"
@@ -23,6 +24,7 @@ void keepLoaderFactories() {}
 
 ImageLoaderBase::~ImageLoaderBase() = default;
 
+// NOLINTNEXTLINE(performance-unnecessary-value-param): overriders keep the text
 void ImageLoaderBase::appendPathInfo(std::string /*path*/) {}
 
 FileLoader::FileLoader(const char* name) : fileName(name ? name : "") {}
@@ -30,7 +32,8 @@ FileLoader::FileLoader(const char* name) : fileName(name ? name : "") {}
 FileLoader::~FileLoader() = default;
 
 void FileLoader::appendPathInfo(std::string path) {
-    fileName.insert(0, path);
+    path += fileName;
+    fileName = std::move(path);
 }
 
 bool FileLoader::uploadImage(Image_base* /*image*/) {

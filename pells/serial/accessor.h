@@ -7,6 +7,7 @@
 #include "pells/core/export.h"
 #include "pells/core/no_destructor.h"
 #include "pells/core/smart_base.h"
+#include "pells/serial/pooled.h"
 #include "pells/serial/serializable.h"
 
 namespace pells {
@@ -15,7 +16,7 @@ namespace pells {
 ///
 /// Accessors hold the state of one save or load, and are made anew for each.
 template <class T>
-class PELLS_TEMPLATE_API Accessor : public smart_base {
+class PELLS_TEMPLATE_API Accessor : public smart_base, public detail::Pooled {
 public:
     /// The place that a loaded value goes to.
     virtual T* target(Serializable* obj) = 0;
@@ -56,10 +57,16 @@ public:
     }
 
 private:
+    static void* wholeOf(Serializable* obj) { return dynamic_cast<void*>(obj); }
+    static const void* wholeOf(const Serializable* obj) { return dynamic_cast<const void*>(obj); }
+
     template <class To, class From>
     static To* ownerOf(From* obj) {
         if (!obj)
             throw std::bad_cast();
+        // A dynamic cast searches the bases; most objects are just of the class.
+        if (typeid(*obj) == typeid(To))
+            return static_cast<To*>(wholeOf(obj));
         return &dynamic_cast<To&>(*obj);
     }
 

@@ -8,13 +8,16 @@
 
 #include "pells/core/export.h"
 #include "pells/serial/field.h"
+#include "pells/serial/pooled.h"
 
 namespace pells {
 
 /// The fields of one class, one a name. Copies share the fields.
 class PELLS_API ClassDescBase {
 public:
-    typedef std::vector<boost::intrusive_ptr<Field>> Fields;
+    typedef std::vector<boost::intrusive_ptr<Field>,
+                        detail::PooledAllocator<boost::intrusive_ptr<Field>>>
+        Fields;
     typedef Fields::const_iterator const_iterator;
 
     /// Adds a field, whose order becomes the number of fields held before this call; it replaces
@@ -22,10 +25,13 @@ public:
     void add(boost::intrusive_ptr<Field> field);
 
     /// The field of a name, or null.
-    boost::intrusive_ptr<Field> get(const std::string& name) const;
+    boost::intrusive_ptr<Field> get(const std::string& name) const { return find(name); }
+
+    /// The same; the description keeps it.
+    Field* find(const std::string& name) const;
 
     /// All fields, in ascending byte order of their names, as is iteration.
-    Fields getFields() const { return fields; }
+    std::vector<boost::intrusive_ptr<Field>> getFields() const { return {begin(), end()}; }
 
     unsigned size() const { return static_cast<unsigned>(fields.size()); }
     bool empty() const { return fields.empty(); }
@@ -40,6 +46,8 @@ protected:
     ClassDescBase& operator=(const ClassDescBase&) = default;
     ClassDescBase& operator=(ClassDescBase&&) = default;
     ~ClassDescBase() = default;
+
+    void reserve(unsigned count) { fields.reserve(count); }
 
 private:
     Fields fields;  // sorted by name: descriptions are short and built for each save and load
@@ -59,6 +67,7 @@ public:
                   sizeof...(Pointers) != 0 &&
                   (std::is_convertible_v<Pointers, boost::intrusive_ptr<Field>> && ...)>>
     explicit ClassDesc(Pointers&&... each) {
+        reserve(sizeof...(Pointers));
         (add(std::forward<Pointers>(each)), ...);
     }
 };

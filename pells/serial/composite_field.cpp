@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <utility>
+#include <vector>
 
 #include "pells/core/no_destructor.h"
 #include "pells/log/log.h"
@@ -13,7 +14,7 @@ namespace {
 
 /// Orders fields by declaration. Two share an index after one was replaced by its name: the names
 /// decide then, so that every run writes the same document.
-bool fieldLess(const boost::intrusive_ptr<Field>& a, const boost::intrusive_ptr<Field>& b) {
+bool fieldLess(const Field* a, const Field* b) {
     PELLS_LOG("mac", "FieldPtr less being called.");
     if (a->getOrder() != b->getOrder())
         return a->getOrder() < b->getOrder();
@@ -22,8 +23,11 @@ bool fieldLess(const boost::intrusive_ptr<Field>& a, const boost::intrusive_ptr<
 
 }  // namespace
 
-CompositeField::CompositeField(const std::string& fieldName, ClassDesc classDesc)
+CompositeField::CompositeField(std::string_view fieldName, ClassDesc&& classDesc)
     : Field(fieldName), desc(std::move(classDesc)) {}
+
+CompositeField::CompositeField(std::string_view fieldName, const ClassDesc& classDesc)
+    : Field(fieldName), desc(classDesc) {}
 
 CompositeField::~CompositeField() = default;
 
@@ -33,9 +37,12 @@ void CompositeField::save(const Serializable* obj, OutTag& tag) {
         return;
     }
     tag.writeOpenTag(true);
-    ClassDesc::Fields fields = desc.getFields();
+    std::vector<Field*, detail::PooledAllocator<Field*>> fields;
+    fields.reserve(desc.size());
+    for (const boost::intrusive_ptr<Field>& field : desc)
+        fields.push_back(field.get());
     std::sort(fields.begin(), fields.end(), fieldLess);
-    for (const boost::intrusive_ptr<Field>& field : fields) {
+    for (Field* const field : fields) {
         OutTag child(tag, field->getName());
         field->save(obj, child);
     }
@@ -61,7 +68,7 @@ const ClassDesc& IgnoreField::emptyDesc() {
     return *desc;
 }
 
-boost::intrusive_ptr<Field> makeComposite(const std::string& fieldName, ClassDesc desc) {
+boost::intrusive_ptr<Field> makeComposite(std::string_view fieldName, ClassDesc desc) {
     if (desc.empty())
         return nullptr;
     return new CompositeField(fieldName, std::move(desc));

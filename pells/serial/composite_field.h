@@ -1,7 +1,7 @@
 #pragma once
 
 #include <boost/smart_ptr/intrusive_ptr.hpp>
-#include <string>
+#include <string_view>
 
 #include "pells/core/export.h"
 #include "pells/serial/class_desc.h"
@@ -12,7 +12,8 @@ namespace pells {
 /// A field whose value is an object: an element with one child element a field.
 class PELLS_API CompositeField : public Field {
 public:
-    CompositeField(const std::string& fieldName, ClassDesc classDesc);
+    CompositeField(std::string_view fieldName, ClassDesc&& classDesc);
+    CompositeField(std::string_view fieldName, const ClassDesc& classDesc);
     ~CompositeField() override;
 
     /// Writes the fields in the order of their declaration; an empty element when there is none.
@@ -42,6 +43,6 @@ public:
 
 /// What Serializable::getField() returns for a class: a field over the description, or null when
 /// that is empty.
-PELLS_API boost::intrusive_ptr<Field> makeComposite(const std::string& fieldName, ClassDesc desc);
+PELLS_API boost::intrusive_ptr<Field> makeComposite(std::string_view fieldName, ClassDesc desc);
 
 }  // namespace pells

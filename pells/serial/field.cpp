@@ -2,7 +2,7 @@
 
 namespace pells {
 
-Field::Field(const std::string& fieldName) : name(fieldName) {}
+Field::Field(std::string_view fieldName) : name(fieldName) {}
 
 Field::~Field() = default;
 

@@ -3,9 +3,11 @@
 #include <boost/smart_ptr/intrusive_ptr.hpp>
 #include <cstdint>
 #include <string>
+#include <string_view>
 
 #include "pells/core/export.h"
 #include "pells/core/smart_base.h"
+#include "pells/serial/pooled.h"
 
 namespace pells {
 
@@ -17,10 +19,10 @@ class Serializable;
 ///
 /// Fields are made anew for each time an object is saved or loaded, and may keep state of that one
 /// run.
-class PELLS_API Field : public smart_base {
+class PELLS_API Field : public smart_base, public detail::Pooled {
 public:
     /// \param fieldName the element name; "" stands for the text content of the object's element.
-    explicit Field(const std::string& fieldName);
+    explicit Field(std::string_view fieldName);
     ~Field() override;
 
     const std::string& getName() const { return name; }

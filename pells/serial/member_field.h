@@ -4,7 +4,7 @@
 /// What a class needs to describe its persistent members.
 
 #include <boost/smart_ptr/intrusive_ptr.hpp>
-#include <string>
+#include <string_view>
 
 #include "pells/core/export.h"
 #include "pells/serial/accessor.h"
@@ -24,14 +24,14 @@ namespace pells {
 template <class Owner, class T>
 class PELLS_TEMPLATE_API MemberField : public SimpleField<T> {
 public:
-    MemberField(const std::string& fieldName, T Owner::*member)
+    MemberField(std::string_view fieldName, T Owner::*member)
         : SimpleField<T>(fieldName, new MemberAccessor<Owner, T>(member),
-                         detail::newHandler<T>(fieldName)) {}
+                         detail::handlerFor<T>(fieldName)) {}
 };
 
 /// A new MemberField of a member, as in makeField("weight", &Part::weight).
 template <class Owner, class T>
-boost::intrusive_ptr<Field> makeField(const std::string& name, T Owner::*member) {
+boost::intrusive_ptr<Field> makeField(std::string_view name, T Owner::*member) {
     return new MemberField<Owner, T>(name, member);
 }
 

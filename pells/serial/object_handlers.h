@@ -56,7 +56,7 @@ void PolymorphicTypeHandler<P, B>::save(const P& value, OutTag& tag) {
 
 template <class P, class B>
 void PolymorphicTypeHandler<P, B>::load(P& value, InTag& tag) {
-    const std::string className = tag.getAttr("class");
+    const std::string& className = tag.getAttr("class");
     std::unique_ptr<Serializable> made(AbstractFactory<Serializable>::createByName(className));
     value = P(dynamic_cast<B*>(made.get()));
     if (!value) {

@@ -16,7 +16,8 @@ namespace {
 
 XMLTokenizer::Token nextToken(XMLTokenizer& tokenizer) {
     static const NoDestructor<Enum<PerformanceCategory>> parser("parser");
-    const Performance probe("next token", parser->get());
+    static const NoDestructor<std::string> label("next token");
+    const Performance probe(*label, parser->get());
     return tokenizer.getToken();
 }
 
@@ -69,18 +70,18 @@ void OpenTag::parseContents(Serializable* obj, const ClassDesc& desc) {
     while (open) {
         Token token = nextToken(tokenizer);
         PELLS_LOG("load", "Processing " << token);
-        open = _parseToken(std::move(token), obj, desc, skipped);
+        open = _parseToken(token, obj, desc, skipped);
     }
 }
 
 /// \return false at the end tag of this element.
-bool OpenTag::_parseToken(Token token, Serializable* obj, const ClassDesc& desc,
+bool OpenTag::_parseToken(Token& token, Serializable* obj, const ClassDesc& desc,
                           SkippedElements& skipped) {
     const ClassDesc& known = skipped.empty() ? desc : IgnoreField::emptyDesc();
-    boost::intrusive_ptr<Field> field;
+    Field* field = nullptr;
     switch (token.type) {
         case Token::T_SINGLE:
-            field = known.get(token.value);
+            field = known.find(token.value);
             if (field) {
                 SingleTag child(*this, std::move(token));
                 field->load(obj, child);
@@ -89,7 +90,7 @@ bool OpenTag::_parseToken(Token token, Serializable* obj, const ClassDesc& desc,
             }
             return true;
         case Token::T_OPEN:
-            field = known.get(token.value);
+            field = known.find(token.value);
             if (field) {
                 OpenTag child(*this, std::move(token));
                 field->load(obj, child);
@@ -100,7 +101,7 @@ bool OpenTag::_parseToken(Token token, Serializable* obj, const ClassDesc& desc,
             }
             return true;
         case Token::T_TEXT:
-            field = known.get("");
+            field = known.find("");
             if (field) {
                 setText(std::move(token.value));
                 field->load(obj, *this);
@@ -145,7 +146,7 @@ void OpenTag::_showValidTags(const std::string& tagText, const ClassDesc& desc) 
 }
 
 void SingleTag::parseContents(Serializable* obj, const ClassDesc& desc) {
-    const boost::intrusive_ptr<Field> field = desc.get("");
+    Field* const field = desc.find("");
     if (field)
         field->load(obj, *this);
 }

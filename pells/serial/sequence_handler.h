@@ -2,6 +2,7 @@
 
 #include <boost/smart_ptr/intrusive_ptr.hpp>
 #include <string>
+#include <string_view>
 #include <type_traits>
 #include <vector>
 
@@ -66,20 +67,20 @@ struct IsVector : std::false_type {};
 template <class Item, class Allocator>
 struct IsVector<std::vector<Item, Allocator>> : std::true_type {};
 
-/// A new handler for the elements of that name.
+/// The handler of a type for the elements of that name.
 template <class T>
-boost::intrusive_ptr<TypeHandler<T>> newHandler(const std::string& name) {
+boost::intrusive_ptr<TypeHandler<T>> handlerFor(std::string_view name) {
     if constexpr (IsVector<T>::value)
-        return new SequenceTypeHandler<T>(name);
+        return new SequenceTypeHandler<T>(std::string(name));
     else
-        return new SimpleTypeHandler<T>;
+        return sharedHandler<SimpleTypeHandler<T>>();
 }
 
 }  // namespace detail
 
 template <class Seq>
 SequenceTypeHandler<Seq>::SequenceTypeHandler(const std::string& name)
-    : itemName(getSingularName(name)), itemHandler(detail::newHandler<Item>(itemName)) {}
+    : itemName(getSingularName(name)), itemHandler(detail::handlerFor<Item>(itemName)) {}
 
 template <class Seq>
 void SequenceTypeHandler<Seq>::save(const Seq& sequence, OutTag& tag) {

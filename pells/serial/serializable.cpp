@@ -41,12 +41,12 @@ boost::intrusive_ptr<Field> Serializable::getField(const std::string& /*name*/) 
 Serializable::~Serializable() = default;
 
 boost::intrusive_ptr<Field> Serializable::mustGetField(const std::string& name,
-                                                       const std::string& method) {
+                                                       const char* method) {
     boost::intrusive_ptr<Field> field = getField(name);
     if (!field) {
         PELLS_LOG("error", className(typeid(*this)) << " must override either Serializable::"
                                                     << method << "() or Serializable::getField()!");
-        throw LoadFail("No " + method + "() method");
+        throw LoadFail("No " + std::string(method) + "() method");
     }
     return field;
 }

@@ -78,7 +78,7 @@ protected:
     Serializable& operator=(const Serializable&) = default;
 
 private:
-    boost::intrusive_ptr<Field> mustGetField(const std::string& name, const std::string& method);
+    boost::intrusive_ptr<Field> mustGetField(const std::string& name, const char* method);
 };
 
 extern template class PELLS_API AbstractFactory<Serializable>;

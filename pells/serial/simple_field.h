@@ -1,7 +1,7 @@
 #pragma once
 
 #include <boost/smart_ptr/intrusive_ptr.hpp>
-#include <string>
+#include <string_view>
 #include <utility>
 
 #include "pells/core/export.h"
@@ -15,7 +15,7 @@ namespace pells {
 template <class T, class U>
 class PELLS_TEMPLATE_API DelegatorField : public Field {
 public:
-    DelegatorField(const std::string& fieldName, boost::intrusive_ptr<Accessor<T>> valueAccessor,
+    DelegatorField(std::string_view fieldName, boost::intrusive_ptr<Accessor<T>> valueAccessor,
                    boost::intrusive_ptr<TypeHandler<U>> valueHandler)
         : Field(fieldName), accessor(std::move(valueAccessor)), handler(std::move(valueHandler)) {}
 

@@ -53,7 +53,8 @@ void TextTypeHandler<T>::save(const T& value, OutTag& tag) {
 
 template <class T>
 void TextTypeHandler<T>::load(T& value, InTag& tag) {
-    const ClassDesc text(new SimpleField<T>("", new VariableAccessor<T>(&value), new TextReader));
+    const ClassDesc text(new SimpleField<T>("", new VariableAccessor<T>(&value),
+                                            detail::sharedHandler<TextReader>()));
     tag.parseContents(nullptr, text);
 }
 

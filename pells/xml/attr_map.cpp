@@ -2,6 +2,8 @@
 
 #include <algorithm>
 
+#include "pells/core/no_destructor.h"
+
 namespace pells {
 
 namespace {
@@ -28,10 +30,21 @@ std::uint32_t bucketCount(std::size_t attributes) {
 
 }  // namespace
 
+AttrMap::AttrMap(const AttrMap& other) : attributes(other.attributes) {
+    if (other.extras)
+        extras = std::make_unique<Extras>(*other.extras);
+}
+
+AttrMap& AttrMap::operator=(const AttrMap& other) {
+    AttrMap copy(other);
+    attributes.swap(copy.attributes);
+    extras.swap(copy.extras);
+    return *this;
+}
+
 void AttrMap::clear() {
     attributes.clear();
-    index.clear();
-    order.clear();
+    extras.reset();
 }
 
 const std::string* AttrMap::find(const std::string& name) const {
@@ -39,20 +52,21 @@ const std::string* AttrMap::find(const std::string& name) const {
     return at == notFound ? nullptr : &attributes[at].second;
 }
 
-void AttrMap::set(const std::string& name, const std::string& value) {
+void AttrMap::set(const std::string& name, std::string value) {
     const std::size_t at = positionOf(name, attributes.size());
     if (at != notFound) {
-        attributes[at].second = value;
+        attributes[at].second = std::move(value);
         return;
     }
-    attributes.emplace_back(name, value);
+    attributes.emplace_back(name, std::move(value));
     indexLast(attributes.size());
-    order.clear();
+    if (extras)
+        extras->order.clear();
 }
 
-void AttrMap::assign(std::vector<Attribute> list) {
+void AttrMap::assign(std::vector<Attribute>&& list) {
     clear();
-    attributes = std::move(list);
+    attributes.swap(list);
     std::size_t kept = 0;
     for (Attribute& each : attributes) {
         const std::size_t earlier = positionOf(each.first, kept);
@@ -69,9 +83,9 @@ void AttrMap::assign(std::vector<Attribute> list) {
 
 /// Looks among the first attributes, which are the ones that the index knows.
 std::size_t AttrMap::positionOf(const std::string& name, std::size_t count) const {
-    if (!index.empty()) {
-        const auto known = index.find(name);
-        return known == index.end() ? notFound : known->second;
+    if (count > shortList) {
+        const auto known = extras->index.find(name);
+        return known == extras->index.end() ? notFound : known->second;
     }
     for (std::size_t at = 0; at < count; ++at) {
         if (attributes[at].first == name)
@@ -84,11 +98,21 @@ std::size_t AttrMap::positionOf(const std::string& name, std::size_t count) cons
 void AttrMap::indexLast(std::size_t count) {
     if (count <= shortList)
         return;
+    if (!extras)
+        extras = std::make_unique<Extras>();
+    std::map<std::string, std::uint32_t>& index = extras->index;
     for (std::size_t at = index.empty() ? 0 : count - 1; at < count; ++at)
         index.emplace(attributes[at].first, static_cast<std::uint32_t>(at));
 }
 
 const AttrMap::Order& AttrMap::visitingOrder() const {
+    static const NoDestructor<Order> none;
+    static const NoDestructor<Order> single(1u);
+    if (attributes.size() <= 1)
+        return attributes.empty() ? *none : *single;
+    if (!extras)
+        extras = std::make_unique<Extras>();
+    Order& order = extras->order;
     if (order.size() == attributes.size())
         return order;
     const std::uint32_t buckets = bucketCount(attributes.size());

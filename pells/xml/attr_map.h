@@ -4,6 +4,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <map>
+#include <memory>
 #include <string>
 #include <utility>
 #include <vector>
@@ -27,6 +28,11 @@ class PELLS_API AttrMap {
 public:
     typedef std::pair<std::string, std::string> Attribute;
 
+    AttrMap() = default;
+    AttrMap(const AttrMap& other);
+    AttrMap& operator=(const AttrMap& other);
+    ~AttrMap() = default;
+
     std::size_t size() const { return attributes.size(); }
     bool empty() const { return attributes.empty(); }
 
@@ -36,10 +42,10 @@ public:
     const std::string* find(const std::string& name) const;
 
     /// Adds an attribute, or replaces the value of the one that has this name.
-    void set(const std::string& name, const std::string& value);
+    void set(const std::string& name, std::string value);
 
     /// Replaces all attributes; a name that occurs twice keeps its first place and last value.
-    void assign(std::vector<Attribute> list);
+    void assign(std::vector<Attribute>&& list);
 
 private:
     typedef std::vector<std::uint32_t> Order;
@@ -71,9 +77,13 @@ private:
     void indexLast(std::size_t count);
     const Order& visitingOrder() const;
 
-    std::vector<Attribute> attributes;           // in the order in which they were added
-    std::map<std::string, std::uint32_t> index;  // empty while the list is short
-    mutable Order order;                         // empty until the attributes are visited
+    struct Extras {
+        std::map<std::string, std::uint32_t> index;  // empty while the list is short
+        Order order;                                 // empty until the attributes are visited
+    };
+
+    std::vector<Attribute> attributes;       // in the order in which they were added
+    mutable std::unique_ptr<Extras> extras;  // most elements need none
 };
 
 }  // namespace pells

@@ -1,8 +1,11 @@
 #include "pells/xml/tag.h"
 
+#include <algorithm>
+#include <cstring>
 #include <locale>
 #include <utility>
 
+#include "pells/core/no_destructor.h"
 #include "pells/serial/serializable.h"
 
 namespace pells {
@@ -13,29 +16,18 @@ const std::size_t indentStep = 4;
 
 unsigned depthLimit = 200;
 
-void appendEscaped(std::string& line, const std::string& text) {
-    std::string::size_type done = 0;
-    for (;;) {
-        const std::string::size_type special = text.find_first_of("<&\"", done);
-        line.append(text, done, special - done);
-        if (special == std::string::npos)
-            return;
-        line += text[special] == '<' ? "&lt;" : text[special] == '&' ? "&amp;" : "&quot;";
-        done = special + 1;
-    }
-}
-
 }  // namespace
 
 Tag::~Tag() = default;
 
-std::string Tag::getAttr(const std::string& attrName) const {
+const std::string& Tag::getAttr(const std::string& attrName) const {
+    static const NoDestructor<std::string> none;
     const std::string* const value = attrs.find(attrName);
-    return value ? *value : std::string();
+    return value ? *value : *none;
 }
 
-void Tag::setAttr(const std::string& attrName, const std::string& value) {
-    attrs.set(attrName, value);
+void Tag::setAttr(const std::string& attrName, std::string value) {
+    attrs.set(attrName, std::move(value));
 }
 
 InTag::InTag(XMLTokenizer& source) : tokenizer(source) {}
@@ -88,12 +80,14 @@ void InTag::setData(Token&& token) {
         setText(std::move(token.value));
     } else {
         name = std::move(token.value);
-        attrs.assign(std::move(token.attrs));
-        setText(std::string());
+        if (!token.attrs.empty() || !attrs.empty())
+            attrs.assign(std::move(token.attrs));
+        if (!text.empty() || scanner)
+            setText(std::string());
     }
 }
 
-void InTag::setText(std::string newText) {
+void InTag::setText(std::string&& newText) {
     text = std::move(newText);
     scanner.reset();
 }
@@ -147,55 +141,101 @@ void OutTag::clearAttrs() {
     attrs.clear();
 }
 
+/// Collects pieces of text, and writes them to the stream together.
+class OutTag::Line {
+public:
+    explicit Line(std::ostream& stream) : out(stream) {}
+    Line(const Line&) = delete;
+    Line& operator=(const Line&) = delete;
+
+    Line& append(const char* text, std::size_t length) {
+        if (length > sizeof pieces - used) {
+            flush();
+            if (length > sizeof pieces) {
+                out.write(text, static_cast<std::streamsize>(length));
+                return *this;
+            }
+        }
+        std::memcpy(pieces + used, text, length);
+        used += length;
+        return *this;
+    }
+
+    Line& append(const std::string& text) { return append(text.data(), text.size()); }
+
+    template <std::size_t size>
+    Line& append(const char (&text)[size]) {
+        return append(text, size - 1);
+    }
+
+    Line& appendSpaces(std::size_t count) {
+        static const char spaces[] = "                                ";
+        for (std::size_t piece; count != 0; count -= piece) {
+            piece = std::min(count, sizeof spaces - 1);
+            append(spaces, piece);
+        }
+        return *this;
+    }
+
+    Line& appendEscaped(const std::string& text) {
+        const char* done = text.data();
+        const char* const end = done + text.size();
+        for (const char* at = done; at != end; ++at) {
+            if (*at != '<' && *at != '&' && *at != '"')
+                continue;
+            append(done, static_cast<std::size_t>(at - done));
+            *at == '<' ? append("&lt;") : *at == '&' ? append("&amp;") : append("&quot;");
+            done = at + 1;
+        }
+        return append(done, static_cast<std::size_t>(end - done));
+    }
+
+    void flush() {
+        out.write(pieces, static_cast<std::streamsize>(used));
+        used = 0;
+    }
+
+private:
+    std::ostream& out;
+    std::size_t used = 0;
+    char pieces[512];
+};
+
 void OutTag::writeOpenTag(bool newline) {
-    std::string line(indent, ' ');
-    line += '<';
+    Line line(out);
+    line.appendSpaces(indent).append("<");
     appendTagAndAttrs(line);
-    line += newline ? ">\n" : ">";
-    write(line);
+    line.append(">\n", newline ? 2 : 1).flush();
 }
 
 void OutTag::writeCloseTag(bool indented) {
-    std::string line(indented ? indent : 0, ' ');
-    line += "</";
-    line += name;
-    line += ">\n";
-    write(line);
+    Line line(out);
+    line.appendSpaces(indented ? indent : 0).append("</").append(name).append(">\n").flush();
 }
 
 void OutTag::writeSingleTag() {
-    std::string line(indent, ' ');
-    line += '<';
+    Line line(out);
+    line.appendSpaces(indent).append("<");
     appendTagAndAttrs(line);
-    line += "/>\n";
-    write(line);
+    line.append("/>\n").flush();
 }
 
 void OutTag::writeText(const std::string& text) {
-    std::string escaped;
-    appendEscaped(escaped, text);
-    write(escaped);
+    Line(out).appendEscaped(text).flush();
 }
 
 void OutTag::writeTagAndAttrs() {
-    std::string piece;
-    appendTagAndAttrs(piece);
-    write(piece);
+    Line line(out);
+    appendTagAndAttrs(line);
+    line.flush();
 }
 
-void OutTag::appendTagAndAttrs(std::string& line) const {
-    line += name;
+void OutTag::appendTagAndAttrs(Line& line) const {
+    line.append(name);
     for (const auto& attr : attrs) {
-        line += ' ';
-        line += attr.first;
-        line += "=\"";
-        appendEscaped(line, attr.second);
-        line += '"';
+        line.append(" ").append(attr.first).append("=\"");
+        line.appendEscaped(attr.second).append("\"");
     }
-}
-
-void OutTag::write(const std::string& line) {
-    out.write(line.data(), static_cast<std::streamsize>(line.size()));
 }
 
 }  // namespace pells

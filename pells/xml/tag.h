@@ -30,11 +30,12 @@ public:
 
     const std::string& getName() const { return name; }
 
-    /// The value of an attribute; "" when the element has none of that name.
-    std::string getAttr(const std::string& attrName) const;
+    /// The value of an attribute; "" when the element has none of that name. Valid until the
+    /// attributes change.
+    const std::string& getAttr(const std::string& attrName) const;
 
     /// Adds an attribute or replaces its value; both are held unescaped.
-    void setAttr(const std::string& attrName, const std::string& value);
+    void setAttr(const std::string& attrName, std::string value);
 
     /// Visit the attributes, as pairs of a name and a value, in the order of AttrMap, which is also
     /// the order in which they are written.
@@ -102,7 +103,7 @@ protected:
     void setData(const Token& token);
     void setData(Token&& token);
 
-    void setText(std::string newText);
+    void setText(std::string&& newText);
 
     XMLTokenizer& tokenizer;
     unsigned depth = 1;
@@ -131,7 +132,7 @@ public:
 private:
     class SkippedElements;
 
-    bool _parseToken(Token token, Serializable* obj, const ClassDesc& desc,
+    bool _parseToken(Token& token, Serializable* obj, const ClassDesc& desc,
                      SkippedElements& skipped);
     bool _closeElement(const Token& token, SkippedElements& skipped);
     void _showValidTags(const std::string& tagText, const ClassDesc& desc);
@@ -202,8 +203,9 @@ protected:
     void writeTagAndAttrs();
 
 private:
-    void appendTagAndAttrs(std::string& line) const;
-    void write(const std::string& line);
+    class Line;
+
+    void appendTagAndAttrs(Line& line) const;
 
     std::ostream& out;
     std::size_t indent = 0;  // in spaces

@@ -1,10 +1,12 @@
 #include "pells/xml/tokenizer.h"
 
-#include <algorithm>
+#include <cstring>
 #include <limits>
 #include <string_view>
 
 #include "pells/xml/char_class.h"
+#include "pells/xml/plain_token.h"
+#include "pells/xml/scan.h"
 #include "pells/xml/stream_window.h"
 
 namespace pells {
@@ -15,6 +17,7 @@ typedef XMLTokenizer::Token Token;
 
 /// Takes the place of a string whose characters nobody wants.
 struct Discard {
+    void reserve(std::size_t) {}
     void append(const char*, const char*) {}
     void push_back(char) {}
 };
@@ -56,7 +59,8 @@ const char* typeName(Token::TokenType type) {
 /// The grammar, written out by hand.
 ///
 /// One character always tells which way to go on, and the place where no way leads on is final. So
-/// nothing is read twice, and a start tag turns into an empty-element tag when its "/" comes.
+/// characters are used once, and a start tag turns into an empty-element tag when its "/" comes.
+/// Only a token that looked plain is read again from its start.
 class XMLParser final : public XMLTokenizer::XMLParserMixin {
 public:
     explicit XMLParser(std::istream& in);
@@ -85,10 +89,12 @@ private:
     bool atAny(unsigned char classes) { return window.more() && isOf(classes, *window.next); }
     bool expect(char wanted);
     bool expect(const char* wanted);
-    bool skip(unsigned char classes);
+    bool skipSpace();
 
-    template <class Text, class Ends>
-    void take(Text& into, Ends ends);
+    template <class Text>
+    void makeRoom(Text& text, char end);
+    template <class Text, class End>
+    void take(Text& into, End isEnd);
 
     StreamWindow window;
     /// No more tokens. Set while one is read, too, so that an exception ends them.
@@ -102,26 +108,29 @@ XMLParser::XMLParser(std::istream& in) : window(in) {
 }
 
 Token XMLParser::next() {
-    Token token;
-    if (!ended) {
-        ended = true;
-        if (window.attach()) {
-            const bool found = readToken(token);
-            window.release();
-            ended = !found;
-        }
+    const bool ready = !std::exchange(ended, true) && window.attach();
+    PlainToken plain;
+    const char* const behind = ready ? plain.read(window.next, window.limit) : nullptr;
+    // Made where the caller wants it, as moving tokens takes as long as reading short ones.
+    Token token{plain.type(), plain.value(), {}};
+    if (behind) {
+        plain.getAttributes(token.attrs);
+        window.next = behind;
     }
-    if (ended) {
+    const bool found = behind || (ready && readToken(token));
+    if (ready)
+        window.release();
+    ended = !found || lastText;
+    if (!found) {
         token = Token();
         token.type = Token::T_EOF;
     }
-    ended = ended || lastText;
     return token;
 }
 
 bool XMLParser::readToken(Token& token) {
     while (token.type == Token::T_IGNORE) {
-        if (skip(CLASS_SPACE))
+        if (skipSpace())
             continue;
         if (!window.more() || !(*window.next == '<' ? readMarkup(token) : readText(token)))
             return false;
@@ -148,9 +157,9 @@ bool XMLParser::readMarkup(Token& token) {
 bool XMLParser::readElement(Token& token) {
     if (!atAny(CLASS_NAME_START))
         return false;
-    take(token.value, [](char c) { return !isOf(CLASS_NAME, c); });
+    take(token.value, EndOfName());
     for (;;) {
-        const bool spaced = skip(CLASS_SPACE);
+        const bool spaced = skipSpace();
         if (expect('>')) {
             token.type = Token::T_OPEN;
             return true;
@@ -167,8 +176,11 @@ bool XMLParser::readElement(Token& token) {
 bool XMLParser::readAttribute(Token& token) {
     if (!atAny(CLASS_NAME_START))
         return false;
+    // Few tags come here, and most of those have few attributes.
+    if (token.attrs.empty())
+        token.attrs.reserve(4);
     token.attrs.emplace_back();
-    take(token.attrs.back().first, [](char c) { return !isOf(CLASS_NAME, c); });
+    take(token.attrs.back().first, EndOfName());
     return readValue(token.attrs.back().second);
 }
 
@@ -176,16 +188,17 @@ bool XMLParser::readEndTag(Token& token) {
     ++window.next;
     if (!atAny(CLASS_NAME_START))
         return false;
-    take(token.value, [](char c) { return !isOf(CLASS_NAME, c); });
-    skip(CLASS_SPACE);
+    take(token.value, EndOfName());
+    skipSpace();
     token.type = Token::T_CLOSE;
     return expect('>');
 }
 
 /// Reads up to markup, or up to an "&" that begins no reference, where the tokens end.
 bool XMLParser::readText(Token& token) {
+    makeRoom(token.value, '<');
     do {
-        take(token.value, [](char c) { return c == '<' || c == '&'; });
+        take(token.value, EndOfText());
         if (!at('&'))
             break;
         char decoded = 0;
@@ -206,7 +219,7 @@ bool XMLParser::skipComment() {
         return false;
     Discard nothing;
     for (;;) {
-        take(nothing, [](char c) { return !isOf(CLASS_COMMENT, c); });
+        take(nothing, EndOfComment());
         if (!expect('-'))
             return false;
         if (expect('-'))
@@ -219,18 +232,18 @@ bool XMLParser::skipComment() {
 
 bool XMLParser::skipDeclaration() {
     ++window.next;
-    if (!expect("xml") || !skip(CLASS_SPACE) || !skipPseudoAttribute("version"))
+    if (!expect("xml") || !skipSpace() || !skipPseudoAttribute("version"))
         return false;
-    bool spaced = skip(CLASS_SPACE);
+    bool spaced = skipSpace();
     if (spaced && at('e')) {
         if (!skipPseudoAttribute("encoding"))
             return false;
-        spaced = skip(CLASS_SPACE);
+        spaced = skipSpace();
     }
     if (spaced && at('s')) {
         if (!skipPseudoAttribute("standalone"))
             return false;
-        skip(CLASS_SPACE);
+        skipSpace();
     }
     return expect("?>");
 }
@@ -242,15 +255,16 @@ bool XMLParser::skipPseudoAttribute(const char* name) {
 
 template <class Text>
 bool XMLParser::readValue(Text& value) {
-    skip(CLASS_SPACE);
+    skipSpace();
     if (!expect('='))
         return false;
-    skip(CLASS_SPACE);
+    skipSpace();
     if (!at('"') && !at('\''))
         return false;
     const char quote = *window.next++;
+    makeRoom(value, quote);
     for (;;) {
-        take(value, [quote](char c) { return c == quote || c == '<' || c == '&'; });
+        take(value, EndOfValue{quote});
         if (expect(quote))
             return true;
         char decoded = 0;
@@ -310,25 +324,40 @@ bool XMLParser::expect(const char* wanted) {
     return *wanted == '\0';
 }
 
-/// Skips characters of the classes; false when there are none.
-bool XMLParser::skip(unsigned char classes) {
-    if (!atAny(classes))
+/// Skips white space; false when there is none.
+bool XMLParser::skipSpace() {
+    if (!atAny(CLASS_SPACE))
         return false;
     Discard nothing;
-    take(nothing, [classes](char c) { return !isOf(classes, c); });
+    take(nothing, EndOfSpace());
     return true;
 }
 
+/// Makes room in an empty text for what goes up to `end`, if that is at hand. Decoding shortens it.
+template <class Text>
+void XMLParser::makeRoom(Text& text, char end) {
+    const std::size_t size = static_cast<std::size_t>(window.limit - window.next);
+    const void* const found = size != 0 ? std::memchr(window.next, end, size) : nullptr;
+    if (found)
+        text.reserve(static_cast<std::size_t>(static_cast<const char*>(found) - window.next));
+}
+
 /// Appends the characters up to one that `ends` them, in one piece if they are at hand in one.
-template <class Text, class Ends>
-void XMLParser::take(Text& into, Ends ends) {
+template <class Text, class End>
+void XMLParser::take(Text& into, End isEnd) {
     const char* stop = nullptr;
     do {
-        stop = std::find_if(window.next, window.limit, ends);
+        stop = scan(window.next, window.limit, isEnd);
         into.append(window.next, stop);
         window.next = stop;
     } while (stop == window.limit && window.refill());
 }
+
+/// Turns into the next token where that is to stay, which saves moving it there.
+struct NextToken {
+    XMLTokenizer::XMLParserMixin& parser;
+    operator Token() const { return parser.next(); }  // NOLINT(google-explicit-constructor)
+};
 
 }  // namespace
 
@@ -342,16 +371,23 @@ XMLTokenizer::XMLTokenizer(std::istream& in) {
 XMLTokenizer::~XMLTokenizer() = default;
 
 XMLTokenizer::Token XMLTokenizer::getToken() {
-    if (pending.type != Token::T_IGNORE)
-        return std::exchange(pending, Token());
-    Token token = parser->next();
-    if (token.type == Token::T_TEXT) {
-        Token follower = parser->next();
-        for (; follower.type == Token::T_TEXT; follower = parser->next())
-            token.value += follower.value;
-        pending = std::move(follower);
-    }
+    const bool held = pending.has_value();
+    Token token = held ? std::move(*pending) : parser->next();
+    if (held)
+        pending.reset();
+    else if (token.type == Token::T_TEXT)
+        completeText(token);
     return token;
+}
+
+void XMLTokenizer::completeText(Token& text) {
+    const NextToken next{*parser};
+    pending.emplace(next);
+    while (pending->type == Token::T_TEXT) {
+        text.value += pending->value;
+        pending.reset();
+        pending.emplace(next);
+    }
 }
 
 std::ostream& operator<<(std::ostream& out, const XMLTokenizer::Token& token) {

@@ -2,6 +2,7 @@
 
 #include <istream>
 #include <memory>
+#include <optional>
 #include <ostream>
 #include <string>
 #include <utility>
@@ -88,8 +89,10 @@ public:
     Token getToken();
 
 private:
+    void completeText(Token& text);
+
     std::unique_ptr<XMLParserMixin> parser;
-    Token pending;
+    std::optional<Token> pending;
 };
 
 /// The grammar behind a tokenizer: what it can be asked for.
