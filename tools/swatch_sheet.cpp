@@ -20,10 +20,10 @@ const int padding = 12;
 const int boxWidth = 236;
 const int boxHeight = 220;
 const int cardWidth = boxWidth + 2 * padding;
-const int cardHeight = boxHeight + 2 * padding + 180;
+const int cardHeight = boxHeight + 2 * padding + 192;
 const int chipWidth = 30;
 const int chipHeight = 14;
-const double columnWidth = 34;
+const double columnWidth = 37;
 
 const Paint background = 0xECEFF3;
 const Paint cardPaint = 0xFFFFFF;
@@ -61,8 +61,16 @@ unsigned sheetHeight(const std::string& path, std::size_t cards, int columns) {
 
 std::string number(float value) {
     char text[32];
-    std::snprintf(text, sizeof text, "%.3g", static_cast<double>(value));
+    std::snprintf(text, sizeof text, "%.6g", static_cast<double>(value));
     return text;
+}
+
+/// A channel to three digits after the point.
+std::string channelText(float value) {
+    if (!(std::abs(value) < 1000))
+        return number(value);
+    const std::string text = number(std::round(value * 1000) / 1000);
+    return text == "-0" ? "0" : text;
 }
 
 double fraction(float channel) {
@@ -95,7 +103,9 @@ void drawColor(Canvas& canvas, const Box& line, const char* label, const pells::
     canvas.text(label, line.x + chipWidth + 8, line.y, 70, labelStyle);
     double right = line.x + line.width;
     for (const float channel : {color.a, color.b, color.g, color.r}) {
-        drawRight(canvas, number(channel), right, line.y, valueStyle);
+        const std::string text = channelText(channel);
+        const bool fits = canvas.textWidth(text, valueStyle) < columnWidth;
+        drawRight(canvas, fits ? text : "large", right, line.y, valueStyle);
         right -= columnWidth;
     }
 }
@@ -134,16 +144,19 @@ void drawValues(Canvas& canvas, const Box& box, const pells::Material& material)
         canvas.text("No texture", line.x, line.y, line.width, originStyle);
         return;
     }
-    const std::string placing = textureText(material);
-    const double room = line.width - canvas.textWidth(placing, labelStyle) - 10;
-    canvas.text(material.textureName(), line.x, line.y, room, valueStyle, true);
-    drawRight(canvas, placing, line.x + line.width, line.y, labelStyle);
+    canvas.text(material.textureName(), line.x, line.y, line.width, valueStyle, true);
+    canvas.text(textureText(material), line.x, line.y + 16, line.width, labelStyle);
 }
 
+/// Whether nothing shows through the large square inside the outline.
 bool isOpaque(const Thumbnail& sphere) {
-    const std::size_t middle =
-        sphere.pixels.size() / 2 + static_cast<std::size_t>(sphere.width) / 2;
-    return sphere.pixels[middle] >> 24 == 255;
+    for (int y = sphere.height / 6; y < sphere.height * 5 / 6; ++y) {
+        const auto row = sphere.pixels.begin() + std::ptrdiff_t{y} * sphere.width;
+        const auto opaque = [](std::uint32_t pixel) { return pixel >> 24 == 255; };
+        if (!std::all_of(row + sphere.width / 6, row + sphere.width * 5 / 6, opaque))
+            return false;
+    }
+    return true;
 }
 
 void drawSphere(Canvas& canvas, const Box& box, const Thumbnail& sphere) {
