@@ -1,61 +1,25 @@
 #include <gtest/gtest.h>
-#include <png.h>
-#include <sys/wait.h>
 
 #include <algorithm>
 #include <boost/filesystem/operations.hpp>
 #include <cstddef>
 #include <cstdint>
-#include <cstdlib>
-#include <cstring>
 #include <string>
 #include <vector>
 
-#include "support/scratch_directory.h"
+#include "support/tool_runs.h"
 #include "tools/archive_writer.h"
 
 namespace {
 
 namespace fs = boost::filesystem;
+using pells_test::decodePng;
+using pells_test::Outcome;
 using pells_test::readFile;
+using pells_test::tga;
 
-/// What a run of the real tool left behind.
-struct Outcome {
-    int status;
-    std::string out;
-    std::string err;
-};
-
-/// Each test has a folder to run the tool in, and one beside it for what the tool prints.
-class ToolTest : public ::testing::Test {
+class ToolTest : public pells_test::ToolRuns {
 protected:
-    ToolTest() { scratch.enter(); }
-
-    /// Runs a script in which $PELLS is the tool.
-    Outcome shell(const std::string& script) {
-        printed.write("script",
-                      "export LSAN_OPTIONS=print_suppressions=0:suppressions='" PELLS_SUPPRESSIONS
-                      "'\nPELLS='" PELLS_TOOL "'\n" +
-                          script + "\n");
-        const std::string command = "bash '" + printed.path("script") + "' >'" +
-                                    printed.path("out") + "' 2>'" + printed.path("err") + "'";
-        const int status = std::system(command.c_str());
-        return {WEXITSTATUS(status), readFile(printed.path("out")), readFile(printed.path("err"))};
-    }
-
-    Outcome pells(const std::string& arguments) { return shell("\"$PELLS\" " + arguments); }
-
-    /// The names in the current folder, the log's aside.
-    static std::vector<std::string> files() {
-        std::vector<std::string> names;
-        for (const fs::directory_entry& entry : fs::directory_iterator(".")) {
-            if (entry.path().filename() != "pells.log")
-                names.push_back(entry.path().filename().string());
-        }
-        std::sort(names.begin(), names.end());
-        return names;
-    }
-
     /// An archive of members "a" and "dir/b c".
     void writeArchive(const std::string& path) {
         pells::ArchiveWriter archive(path);
@@ -80,9 +44,6 @@ protected:
             touch -d 2020-04-01 assets/Textures/marble.tga)");
         ASSERT_EQ(outcome.status, 0) << outcome.err;
     }
-
-    pells_test::ScratchDirectory printed;
-    pells_test::ScratchDirectory scratch;
 };
 
 TEST_F(ToolTest, PacksListsAndPrints) {
@@ -249,23 +210,6 @@ TEST_F(ToolTest, ResolvesNamesToWhatServesThem) {
         << tie.out;
 }
 
-/// A decoded PNG: 0xRRGGBB each.
-std::vector<std::uint32_t> decodePng(const std::string& path, unsigned& width) {
-    png_image image;
-    std::memset(&image, 0, sizeof image);
-    image.version = PNG_IMAGE_VERSION;
-    EXPECT_TRUE(png_image_begin_read_from_file(&image, path.c_str())) << image.message;
-    image.format = PNG_FORMAT_RGB;
-    std::vector<unsigned char> bytes(PNG_IMAGE_SIZE(image));
-    EXPECT_TRUE(png_image_finish_read(&image, nullptr, bytes.data(), 0, nullptr)) << image.message;
-    width = image.width;
-    std::vector<std::uint32_t> pixels;
-    for (std::size_t i = 0; i + 2 < bytes.size(); i += 3)
-        pixels.push_back(std::uint32_t{bytes[i]} << 16 | std::uint32_t{bytes[i + 1]} << 8 |
-                         bytes[i + 2]);
-    return pixels;
-}
-
 TEST_F(ToolTest, DrawsTheSampleSheet) {
     prepareSamples();
     const Outcome outcome = pells("sheet assets -o sheet.png --log time.summary");
@@ -300,17 +244,6 @@ TEST_F(ToolTest, DrawsTheSampleSheet) {
     EXPECT_GT(heart, 0);
     // The plate of the badge, opaque and not scaled, is there in its own colour.
     EXPECT_GT(std::count(pixels.begin(), pixels.end(), 0x2364AAU), 5000);
-}
-
-std::string tga(int type, unsigned width, unsigned height, int depth, const std::string& pixels) {
-    std::string header(18, '\0');
-    header[2] = static_cast<char>(type);
-    header[12] = static_cast<char>(width);
-    header[13] = static_cast<char>(width >> 8);
-    header[14] = static_cast<char>(height);
-    header[15] = static_cast<char>(height >> 8);
-    header[16] = static_cast<char>(depth);
-    return header + pixels;
 }
 
 // Whatever the pictures and their names are, there is a sheet that says how each of them fared.

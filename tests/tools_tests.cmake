@@ -3,10 +3,19 @@ if(NOT PELLS_BUILD_TOOLS)
 endif()
 
 pells_add_test(archive_writer_test SOURCES archive_writer_test.cpp LIBRARIES pells_archive_writer)
-pells_add_test(tool_test SOURCES tool_test.cpp LIBRARIES pells_archive_writer)
-find_package(PNG REQUIRED)
-target_link_libraries(tool_test PRIVATE PNG::PNG)
-target_compile_definitions(tool_test PRIVATE
-    PELLS_TOOL="$<TARGET_FILE:pells_tool>" PELLS_SAMPLES="${PROJECT_SOURCE_DIR}/samples"
-    PELLS_SUPPRESSIONS="${CMAKE_CURRENT_SOURCE_DIR}/support/leaks_of_others.supp")
-add_dependencies(tool_test pells_tool)
+
+# Tests that run the tool.
+function(pells_add_tool_test name)
+    pells_add_test(${name} ${ARGN})
+    find_package(PNG REQUIRED)
+    target_link_libraries(${name} PRIVATE PNG::PNG Boost::filesystem)
+    target_compile_definitions(${name} PRIVATE
+        PELLS_TOOL="$<TARGET_FILE:pells_tool>" PELLS_SAMPLES="${PROJECT_SOURCE_DIR}/samples"
+        PELLS_SUPPRESSIONS="${CMAKE_CURRENT_SOURCE_DIR}/support/leaks_of_others.supp")
+    add_dependencies(${name} pells_tool)
+endfunction()
+
+pells_add_tool_test(tool_test SOURCES tool_test.cpp LIBRARIES pells_archive_writer)
+pells_add_tool_test(swatch_test
+    SOURCES swatch_test.cpp ../tools/sphere.cpp ../tools/thumbnail.cpp
+    LIBRARIES pells_archive_writer)

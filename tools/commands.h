@@ -17,5 +17,6 @@ void addList(CLI::App& app);
 void addCat(CLI::App& app);
 void addResolve(CLI::App& app);
 void addSheet(CLI::App& app);
+void addSwatch(CLI::App& app);
 
 }  // namespace pells_tool

@@ -25,6 +25,7 @@ void addCommands(CLI::App& app) {
     pells_tool::addCat(app);
     pells_tool::addResolve(app);
     pells_tool::addSheet(app);
+    pells_tool::addSwatch(app);
 }
 
 /// "pells", or "pells: COMMAND" once that is known.
@@ -72,7 +73,9 @@ int run(CLI::App& app, int argc, char** argv) {
 
 int main(int argc, char** argv) {
     pells_tool::prepareProcess();
-    CLI::App app("Makes and looks into pell archives, and shows what an asset root serves.");
+    CLI::App app(
+        "Makes and looks into pell archives, shows what an asset root serves, and draws "
+        "materials.");
     try {
         addCommands(app);
         return run(app, argc, argv);

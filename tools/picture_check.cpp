@@ -53,12 +53,6 @@ std::string complaint(int type) {
     }
 }
 
-std::string complaint(const pells::ImageLoaderBase& loader) {
-    const auto* const tga = dynamic_cast<const pells::TGAFileLoader*>(&loader);
-    const int type = tga ? imageType(*tga) : -1;
-    return type < 0 ? "" : complaint(type);
-}
-
 /// Which of its stores the asset manager took a loader's file from.
 std::vector<std::string> originOf(const pells::ImageLoaderBase& loader) {
     const auto* const tga = dynamic_cast<const pells::TGAFileLoader*>(&loader);
@@ -118,6 +112,12 @@ std::vector<std::string> definedPictures(ErrorLines& errors) {
     if (names.empty())
         throw pells::FileError(asset, reasons.empty() ? "It defines no picture" : reasons.front());
     return names;
+}
+
+std::string complaint(const pells::ImageLoaderBase& loader) {
+    const auto* const tga = dynamic_cast<const pells::TGAFileLoader*>(&loader);
+    const int type = tga ? imageType(*tga) : -1;
+    return type < 0 ? "" : complaint(type);
 }
 
 PictureCheck checkPicture(const std::string& name, ErrorLines& errors) {

@@ -6,6 +6,10 @@
 
 #include "pells/image/image_base.h"
 
+namespace pells {
+class ImageLoaderBase;
+}
+
 namespace pells_tool {
 
 class ErrorLines;
@@ -34,6 +38,9 @@ struct PictureCheck {
 ///
 /// \throws pells::FileError when they cannot be read or hold none.
 std::vector<std::string> definedPictures(ErrorLines& errors);
+
+/// Why the pixels of a file that was read may not be what it means; empty where they are.
+std::string complaint(const pells::ImageLoaderBase& loader);
 
 /// Asks the loaders of a picture one after the other.
 PictureCheck checkPicture(const std::string& name, ErrorLines& errors);

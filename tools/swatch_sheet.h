@@ -1,0 +1,50 @@
+#pragma once
+
+#include <cstddef>
+#include <memory>
+#include <string>
+
+#include "pells/material/material.h"
+#include "tools/png_file.h"
+#include "tools/thumbnail.h"
+
+namespace pells_tool {
+
+/// What a card shows of one material. The texts may hold any bytes.
+struct SwatchCard {
+    std::string name;
+    std::string origin;  ///< a line below the name
+    pells::Material material;
+    Thumbnail sphere;       ///< as large as SwatchSheet::sphereSize
+    std::string operation;  ///< how it came from the cards before: "+", "=" or none
+};
+
+/// Draws materials in rows and columns on one PNG picture, row after row: memory does not depend on
+/// the number of materials.
+class SwatchSheet {
+public:
+    /// \param cards the number of cards that will be added, at least 1.
+    /// \throws pells::FileError here and below when the file cannot be written.
+    SwatchSheet(const std::string& path, std::size_t cards);
+    ~SwatchSheet();
+
+    /// Adds the next card. The file is written up to the last full row.
+    void add(const SwatchCard& card);
+
+    /// Gives the file its name.
+    void finish();
+
+    static constexpr int sphereSize = 196;
+
+private:
+    class Strip;
+
+    void writeRow();
+
+    int columns;
+    PngFile png;
+    std::unique_ptr<Strip> row;
+    int filled;
+};
+
+}  // namespace pells_tool
