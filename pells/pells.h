@@ -3,6 +3,10 @@
 /// \file
 /// Everything the library offers.
 
+#include "pells/asset/asset_manager.h"
+#include "pells/asset/pell_archive.h"
+#include "pells/asset/stream_container.h"
+#include "pells/asset/zlib_wrapper.h"
 #include "pells/core/check_memory.h"
 #include "pells/core/class_name.h"
 #include "pells/core/factory.h"

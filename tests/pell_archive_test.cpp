@@ -45,7 +45,9 @@ class PellArchive : public pells_test::LibraryTest {
 protected:
     PellArchive() { pells_test::prefs()["log"] = "error"; }
 
-    std::string write(const std::string& bytes) const { return scratch.write("a.pell", bytes); }
+    std::string write(const std::string& bytes) const {
+        return pells_test::writeArchiveFile(scratch, bytes);
+    }
 };
 
 TEST_F(PellArchive, RefusesDamagedHeadersAndDirectoriesWithTheReason) {

@@ -7,6 +7,8 @@
 #include <utility>
 #include <vector>
 
+#include "support/scratch_directory.h"
+
 namespace pells_test {
 
 /// A zlib stream of the bytes.
@@ -47,6 +49,15 @@ inline std::string archiveOf(const std::vector<std::pair<std::string, std::strin
         data += stream;
     }
     return archiveWithDirectory(directory, data);
+}
+
+/// Writes an archive's bytes to a new file in place of the last one; returns its path.
+///
+/// Some file systems put a file on disk at once when it was emptied and written again, which makes
+/// thousands of cases slow.
+inline std::string writeArchiveFile(const ScratchDirectory& scratch, const std::string& bytes) {
+    std::remove(scratch.path("a.pell").c_str());
+    return scratch.write("a.pell", bytes);
 }
 
 }  // namespace pells_test
