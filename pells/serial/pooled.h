@@ -45,16 +45,17 @@ public:
     PooledAllocator(const PooledAllocator<U>& /*other*/) noexcept {}  // NOLINT
 
     T* allocate(std::size_t count) {
-        return static_cast<T*>(count <= static_cast<std::size_t>(-1) / sizeof(T)
-                                   ? allocatePooled(count * sizeof(T))
-                                   : throw std::bad_array_new_length());
+        if (count > static_cast<std::size_t>(-1) / itemSize)
+            throw std::bad_array_new_length();
+        return static_cast<T*>(allocatePooled(count * itemSize));
     }
-    void deallocate(T* memory, std::size_t count) noexcept {
-        freePooled(memory, count * sizeof(T));
-    }
+    void deallocate(T* memory, std::size_t count) noexcept { freePooled(memory, count * itemSize); }
 
     friend bool operator==(const PooledAllocator&, const PooledAllocator&) { return true; }
     friend bool operator!=(const PooledAllocator&, const PooledAllocator&) { return false; }
+
+private:
+    static constexpr std::size_t itemSize = sizeof(T);  // NOLINT: of pointers, too
 };
 
 }  // namespace detail

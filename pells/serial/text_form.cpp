@@ -8,8 +8,9 @@ namespace detail {
 
 namespace {
 
+/// White space of the classic locale, without looking its facet up for each character.
 bool isSpace(char c) {
-    return std::isspace(c, std::locale::classic());
+    return c == ' ' || (c >= '\t' && c <= '\r');
 }
 
 bool isDigit(char c) {
