@@ -77,7 +77,7 @@ std::string reasonOf(ErrorLines& errors, const std::string& thrown) {
 }
 
 Picture readPicture(const std::string& name, const std::string& where, ErrorLines& errors) {
-    const Picture picture(new pells::Image_base(std::string()));
+    Picture picture(new pells::Image_base(std::string()));
     pells::TGAFileLoader loader(name.c_str());
     std::string thrown;
     bool loaded = false;
