@@ -169,7 +169,7 @@ TEST_F(SwatchTest, FailsWithOneLineAndLeavesNothing) {
     const Failing cases[] = {
         {"", 2, "MATERIAL.xml or --blend is required (see --help)"},
         {"--root root", 2, "MATERIAL.xml or --blend is required (see --help)"},
-        {"--blend plain.xml", 2, "--blend: At least 2 required but received 1 (see --help)"},
+        {"--blend plain.xml", 2, "--blend: 2 required A.xml B.xml missing (see --help)"},
         {"missing.xml", 1, "missing.xml: No such file or directory"},
         {"plain.xml root", 1, "root: Is a directory"},
         {"/dev/zero", 1, "/dev/zero: Not a regular file"},
@@ -219,7 +219,7 @@ std::string glowing(const std::string& name, const std::string& red, const std::
 TEST_F(SwatchTest, DrawsMaterialsAndTheirBlend) {
     scratch.write("red.xml", glowing("material", "1", "0"));
     scratch.write("blue.xml", glowing("anything", "0", "1"));
-    ASSERT_EQ(pells("swatch red.xml -o red.png --blend red.xml blue.xml").err, "");
+    ASSERT_EQ(pells("swatch --blend red.xml blue.xml red.xml -o red.png").err, "");
     unsigned width = 0;
     const std::vector<std::uint32_t> pixels = decodePng("red.png", width);
     // A sphere of 196 pixels has 30172 of them. Red was drawn twice.

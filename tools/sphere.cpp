@@ -194,8 +194,10 @@ std::uint32_t pixelOf(int column, int row, int size, const Surface& surface,
                       const TextureAt& textureAt) {
     Shade sum = {0, 0, 0, 0};
     for (int i = 0; i < samples * samples; ++i) {
-        const double x = (column + (i % samples + 0.5) / samples) * 2 / size - 1;
-        const double y = 1 - (row + (i / samples + 0.5) / samples) * 2 / size;
+        const int across = i % samples;
+        const int down = i / samples;
+        const double x = (column + (across + 0.5) / samples) * 2 / size - 1;
+        const double y = 1 - (row + (down + 0.5) / samples) * 2 / size;
         const double square = 1 - x * x - y * y;
         if (square < 0)
             continue;

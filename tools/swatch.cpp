@@ -77,7 +77,7 @@ std::string reasonOf(ErrorLines& errors, const std::string& thrown) {
 }
 
 Picture readPicture(const std::string& name, const std::string& where, ErrorLines& errors) {
-    const Picture picture(new pells::Image_base(std::string()));
+    Picture picture(new pells::Image_base(std::string()));
     pells::TGAFileLoader loader(name.c_str());
     std::string thrown;
     bool loaded = false;
@@ -143,7 +143,9 @@ void addSwatch(CLI::App& app) {
         ->required()
         ->type_name("FILE");
     command->add_option("--blend", options->blended, "Two materials, and the blend of both")
-        ->expected(2)
+        ->type_size(2)
+        ->expected(1)
+        ->allow_extra_args(false)
         ->type_name("A.xml B.xml");
     command->add_option("--root", options->root, "The asset root that holds the textures")
         ->type_name("ROOT");

@@ -197,9 +197,9 @@ public:
     Strip(int columns, int height) : Canvas(sheetWidth(columns), height) {
         fill({0, 0, static_cast<double>(width()), static_cast<double>(height)}, background);
     }
-    void writeTo(PngFile& png) const {
+    void writeTo(PngFile& file) const {
         for (int y = 0; y < height(); ++y)
-            png.writeRow(reinterpret_cast<const unsigned char*>(row(y).data()));
+            file.writeRow(reinterpret_cast<const unsigned char*>(row(y).data()));
     }
 };
 
