@@ -33,7 +33,7 @@ void CheckMemory::removeMemTracking(const std::string& name) {
 }
 
 void CheckMemory::dumpMemory(const std::string& name) {
-    memoryStates().find(name);
+    static_cast<void>(memoryStates().find(name));
 }
 
 }  // namespace pells

@@ -24,12 +24,12 @@ UndoRedoSequence::~UndoRedoSequence() = default;
 
 void UndoRedoSequence::addUndoable(boost::intrusive_ptr<UndoableStep> step) {
     clearRedoStack();
-    steps.push_back(step);
+    steps.push_back(std::move(step));
     current = static_cast<int>(steps.size()) - 1;
 }
 
 void UndoRedoSequence::addRedoable(boost::intrusive_ptr<UndoableStep> step) {
-    steps.push_back(step);
+    steps.push_back(std::move(step));
     current = std::max(current, allUndone);
 }
 
