@@ -1,8 +1,22 @@
 #include "pells/core/version.h"
 
 #include <boost/lexical_cast.hpp>
+#include <typeinfo>
 
 namespace pells {
+
+namespace {
+
+/// \throws boost::bad_lexical_cast
+std::int16_t numberOf(const std::string& text) {
+    // Not a lexical_cast to 16 bits, whose arithmetic overflows for some texts.
+    const int number = boost::lexical_cast<int>(text);
+    if (number != static_cast<std::int16_t>(number))
+        throw boost::bad_lexical_cast(typeid(std::string), typeid(std::int16_t));
+    return static_cast<std::int16_t>(number);
+}
+
+}  // namespace
 
 Version::Version(std::int16_t majorNumber, std::int16_t minorNumber)
     : numbers(majorNumber, minorNumber) {}
@@ -11,9 +25,9 @@ Version::Version(const Pair& bothNumbers) : numbers(bothNumbers) {}
 
 Version::Version(const std::string& text) {
     const std::string::size_type dot = text.find('.');
-    numbers.first = boost::lexical_cast<std::int16_t>(text.substr(0, dot));
+    numbers.first = numberOf(text.substr(0, dot));
     if (dot != std::string::npos)
-        numbers.second = boost::lexical_cast<std::int16_t>(text.substr(dot + 1));
+        numbers.second = numberOf(text.substr(dot + 1));
 }
 
 std::string Version::str() const {

@@ -6,7 +6,6 @@
 #include <exception>
 #include <limits>
 #include <new>
-#include <vector>
 
 #include "pells/asset/zlib_wrapper.h"
 #include "pells/image/image_loaders.h"
@@ -254,12 +253,9 @@ bool Image_base::setColorAsARGB(int x, int y, unsigned char c0, unsigned char c1
 void Image_base::flipVertically() {
     if (!data)
         return;
-    const std::size_t rowBytes = offsetOf(0, 1);
-    std::vector<unsigned char> row(rowBytes);
     for (int upper = 0, lower = height - 1; upper < lower; ++upper, --lower) {
-        std::memcpy(row.data(), &data[offsetOf(0, upper)], rowBytes);
-        std::memcpy(&data[offsetOf(0, upper)], &data[offsetOf(0, lower)], rowBytes);
-        std::memcpy(&data[offsetOf(0, lower)], row.data(), rowBytes);
+        unsigned char* const row = data.get() + offsetOf(0, upper);
+        std::swap_ranges(row, row + offsetOf(0, 1), data.get() + offsetOf(0, lower));
     }
 }
 

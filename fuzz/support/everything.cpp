@@ -1,0 +1,61 @@
+#include "fuzz/support/everything.h"
+
+#include <sstream>
+
+#include "pells/xml/tag.h"
+
+namespace pells_fuzz {
+
+namespace {
+
+const pells::SerializableFactory<CountingStep> stepFactory("CountingStep");
+const pells::SerializableFactory<Everything> everythingFactory("Everything");
+
+}  // namespace
+
+using pells::makeField;
+
+boost::intrusive_ptr<pells::Field> CountingStep::getField(const std::string& name) {
+    return pells::makeComposite(name, pells::ClassDesc(UndoableStep::getField("super"),
+                                                       makeField("label", &CountingStep::label)));
+}
+
+boost::intrusive_ptr<pells::Field> Everything::getField(const std::string& name) {
+    return pells::makeComposite(
+        name, pells::ClassDesc(makeField("f", &Everything::f), makeField("d", &Everything::d),
+                               makeField("b", &Everything::b), makeField("i", &Everything::i),
+                               makeField("u", &Everything::u), makeField("l", &Everything::l),
+                               makeField("s", &Everything::s), makeField("c", &Everything::c),
+                               makeField("material", &Everything::material),
+                               makeField("history", &Everything::history),
+                               makeField("child", &Everything::child),
+                               makeField("ints", &Everything::ints),
+                               makeField("words", &Everything::words),
+                               makeField("matrices", &Everything::matrices),
+                               makeField("materials", &Everything::materials),
+                               makeField("children", &Everything::children)));
+}
+
+std::string saved(pells::Serializable& object, int precision) {
+    std::ostringstream out;
+    out.precision(precision);
+    pells::OutTag tag(out, "root");
+    object.save(tag);
+    return out.str();
+}
+
+void load(pells::Serializable& object, const std::string& document) {
+    typedef pells::XMLTokenizer::Token Token;
+    std::istringstream in(document);
+    pells::XMLTokenizer tokenizer(in);
+    const Token token = tokenizer.getToken();
+    if (token.type == Token::T_SINGLE) {
+        pells::SingleTag root(tokenizer, token);
+        object.load(root, nullptr);
+    } else if (token.type == Token::T_OPEN) {
+        pells::OpenTag root(tokenizer, token);
+        object.load(root, nullptr);
+    }
+}
+
+}  // namespace pells_fuzz
