@@ -2,8 +2,10 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <regex>
 
+#include "pells/core/factory.h"
 #include "pells/platform/counter.h"
 #include "support/test_prefs.h"
 
@@ -61,12 +63,50 @@ TEST_F(ProbeTest, LogsItsWholeTimeAndTheCategorysShare) {
     EXPECT_LE(std::stoul(match[2]) + 2000u, std::stoul(match[1]));
 }
 
-TEST_F(ProbeTest, RegistersItsTagEveryTime) {
-    pells_test::prefs() = {{"log", "log.dumptags"}};
-    for (int i = 0; i < 5; ++i)
-        const Performance probe("p", &PerformanceCategory::find("work"));
-    pells::Log::instance().dumpTags();
-    EXPECT_EQ(pells_test::logLines().at(3), "log.dumptags: off   5  time.detail.work");
+TEST_F(ProbeTest, RegistersItsTagEveryTimeWithTheLogOfTheMoment) {
+    PerformanceCategory& work = PerformanceCategory::find("work");
+    for (const char* verdict : {"on ", "off", "on "}) {
+        const bool on = verdict == std::string("on ");
+        pells_test::prefs() = {{"log", on ? "time log.dumptags" : "log.dumptags"}};
+        for (int i = 0; i < 4; ++i)
+            const Performance probe("p", &work);
+        pells::Log::instance().isEnabled("time.detail.work", false);
+        pells::Log::instance().dumpTags();
+        const std::vector<std::string> lines = pells_test::logLines();
+        const std::string entry =
+            std::string("log.dumptags: ") + verdict + "   5  time.detail.work";
+        EXPECT_EQ(std::count(lines.begin(), lines.end(), entry), 1) << verdict;
+        EXPECT_EQ(std::count(lines.begin(), lines.end(), "time.detail.work: Entering p"),
+                  on ? 4 : 0);
+        pells::SingletonList::freeSingletons();
+    }
+}
+
+TEST_F(ProbeTest, KeepsItsVerdictAndItsLabelToTheEnd) {
+    pells_test::prefs() = {{"log", "time.detail.kept"}};
+    {
+        std::string label = "a label that is too long to be kept in place";
+        const Performance kept(label, &PerformanceCategory::find("kept"));
+        const Performance silent("silent", &PerformanceCategory::find("other"));
+        label.assign(label.size(), '-');
+        pells::SingletonList::freeSingletons();
+        pells_test::prefs() = {{"log", "time.detail.other"}};
+    }
+    // The exit made a new log, which has the tag of no probe.
+    const std::vector<std::string> lines = pells_test::logLines();
+    ASSERT_EQ(lines.size(), 1u);
+    EXPECT_EQ(
+        lines[0].find("time.detail.kept: Leaving  a label that is too long to be kept in place"
+                      " ("),
+        0u)
+        << lines[0];
+}
+
+TEST_F(ProbeTest, ChargesNothingWhenThereCanBeNoLog) {
+    pells::FactoryByName::forget("Prefs");
+    PerformanceCategory& work = PerformanceCategory::find("work");
+    EXPECT_THROW(Performance("p", &work), pells::Prefs::NoImplementation);
+    EXPECT_EQ(PerformanceCategory::pop(5), 0u);
 }
 
 }  // namespace

@@ -41,7 +41,7 @@ public:
     std::string name;
     bool works = true;
 
-private:
+protected:
     bool note(const std::string& what) const {
         journal.push_back(what + ' ' + name);
         return works;
@@ -57,6 +57,38 @@ StepPtr record(UndoRedoSequence& history, const std::string& name) {
     history.addUndoable(step);
     return step;
 }
+
+/// A step that makes its history let go of it, as one that closes a document might.
+class Closing : public Step {
+public:
+    explicit Closing(UndoRedoSequence& ownHistory) : Step("closing"), history(ownHistory) {}
+    ~Closing() override { note("end of"); }
+
+    bool undo() override { return close("undo"); }
+    bool redo() override { return close("redo"); }
+
+private:
+    bool close(const std::string& what) {
+        history.clear();
+        return note(what);
+    }
+
+    UndoRedoSequence& history;
+};
+
+class ClosingWithItsOwnCount : public Closing {
+public:
+    using Closing::Closing;
+
+    void addRef() override { ++references; }
+    void release() override {
+        if (--references == 0)
+            dispose();
+    }
+
+private:
+    int references = 0;
+};
 
 class Select : public UndoRedoSequence::BatchMethod {
 public:
@@ -144,6 +176,19 @@ TEST_F(UndoTest, GoesBackAndForthUntilAStepFails) {
     EXPECT_FALSE(history.redo());
     expectSizes(history, 2, 0);
     EXPECT_EQ(takeJournal(), (Entries{"undo b", "redo b", "undo b", "undo b", "undo a", "redo a"}));
+}
+
+TEST_F(UndoTest, AStepOutlivesTheCallInWhichItsHistoryLetsGoOfIt) {
+    history.addUndoable(new Closing(history));
+    history.undo();
+    EXPECT_EQ(takeJournal(), (Entries{"undo closing", "end of closing"}));
+    history.addRedoable(new Closing(history));
+    history.redo();
+    EXPECT_EQ(takeJournal(), (Entries{"redo closing", "end of closing"}));
+    history.addUndoable(new ClosingWithItsOwnCount(history));
+    history.undo();
+    EXPECT_EQ(takeJournal(), (Entries{"undo closing", "end of closing"}));
+    expectSizes(history, 0, 0);
 }
 
 TEST_F(UndoTest, RecordingDiscardsWhatWasUndone) {

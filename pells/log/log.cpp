@@ -38,6 +38,8 @@ public:
     return true;
 }();
 
+std::uint64_t logsMade = 0;
+
 const char prefsFileName[] = "pells.log.prefs";
 
 std::string readPrefsFile() {
@@ -65,7 +67,8 @@ std::string localTime() {
 Log::Log()
     : openMode(std::ios_base::out | std::ios_base::trunc),
       flushEach(false),
-      teeStream(debugStream, logFile) {
+      teeStream(debugStream, logFile),
+      serialNumber(++logsMade) {
     readRules();
     writeHeader();
     flushEach = isEnabled("log.flush", true);
@@ -167,5 +170,22 @@ void Log::writeLine(const LogKey& key, const std::string& message) {
 
 LogKey::LogKey(const std::string& siteTag)
     : tag(siteTag), enabled(Log::instance().registerTag(siteTag)) {}
+
+RecurringTag::RecurringTag(const std::string& recurringTag) : tag(recurringTag) {}
+
+bool RecurringTag::registerOnceMore() {
+    Log& log = Log::instance();
+    if (log.serialNumber == logNumber) {
+        ++state->useCount;
+        return state->enabled;
+    }
+    const bool enabled = log.registerTag(tag);
+    const auto entry = log.tagTable.find(tag);
+    if (entry != log.tagTable.end()) {
+        logNumber = log.serialNumber;
+        state = &entry->second;
+    }
+    return enabled;
+}
 
 }  // namespace pells

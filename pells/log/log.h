@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstdint>
 #include <fstream>
 #include <ios>
 #include <list>
@@ -16,6 +17,7 @@ namespace pells {
 
 class Log;
 class LogKey;
+class RecurringTag;
 extern template class PELLS_API RogueSingleton<Log, SingletonFactory<Log>>;
 extern template class PELLS_API Singleton<Log, SingletonFactory<Log>>;
 
@@ -61,6 +63,7 @@ public:
 
 private:
     friend class SingletonFactory<Log>;
+    friend class RecurringTag;
 
     struct TagState {
         int useCount;
@@ -82,6 +85,8 @@ private:
     bool flushEach;
     debugostream debugStream;
     tee_ostream<> teeStream;
+    // Unlike its address, no other log of the process has it.
+    std::uint64_t serialNumber;
 };
 
 /// The tag of one logging site and whether it is on, decided once.
@@ -103,6 +108,29 @@ public:
 private:
     std::string tag;
     bool enabled;
+};
+
+/// A tag that is registered over and over, such as that of a probe.
+///
+/// It saves all registrations with the same log but the first the look-up. One thread only.
+class PELLS_API RecurringTag {
+public:
+    /// Registers nothing yet.
+    explicit RecurringTag(const std::string& recurringTag);
+
+    const std::string& getTag() const { return tag; }
+
+    /// Registers the tag once more, as a new LogKey does; the log is created if there is none.
+    ///
+    /// \return the verdict of the log that there is now.
+    /// \throws Prefs::NoImplementation as LogKey does.
+    bool registerOnceMore();
+
+private:
+    std::string tag;
+    // The tag's entry in the table of the log with this number; no log has the number 0.
+    std::uint64_t logNumber = 0;
+    Log::TagState* state = nullptr;
 };
 
 /// Writes one line if the tag is on: the tag, ": ", the message and a line feed.

@@ -15,8 +15,8 @@ template class DemandNamedObject<PerformanceCategory, PerformanceCategory*>;
 
 namespace {
 
-void writeLine(const LogKey& key, const std::string& message) {
-    Log::instance().getStream() << key.getTag() << ": " << message << '\n';
+void writeLine(const std::string& tag, const std::string& message) {
+    Log::instance().getStream() << tag << ": " << message << '\n';
     Log::instance().flush();
 }
 
@@ -41,17 +41,17 @@ void writeTimeSummary() {
     std::ostringstream line;
     line << std::setw(width) << "Category"
          << "      uS    (%)";
-    writeLine(*key, line.str());
+    writeLine(key->getTag(), line.str());
     for (const PerformanceCategory* category : categories) {
         line.str("");
         line << std::setw(width) << category->getName() << "  " << std::setw(6) << category->total()
              << " (" << std::setw(3) << percentage(category->total(), sum) << "%)";
-        writeLine(*key, line.str());
+        writeLine(key->getTag(), line.str());
     }
     line.str("");
     line << std::setw(width) << "Total"
          << "  " << std::setw(6) << sum;
-    writeLine(*key, line.str());
+    writeLine(key->getTag(), line.str());
 }
 
 /// Writes the summary when the library is unloaded, unless the log is gone by then.
@@ -73,7 +73,8 @@ void installTimeSummaryHook() {
 }
 
 PerformanceCategory::PerformanceCategory(const std::string& categoryName)
-    : DemandNamedObject<PerformanceCategory, PerformanceCategory*>(categoryName) {}
+    : DemandNamedObject<PerformanceCategory, PerformanceCategory*>(categoryName),
+      detailTag("time.detail." + categoryName) {}
 
 PerformanceCategory::~PerformanceCategory() = default;
 
@@ -115,31 +116,43 @@ std::uint32_t PerformanceCategory::pop(std::uint32_t t) {
 }
 
 Performance::Performance(const std::string& label, PerformanceCategory* chargedTo)
-    : name(label),
-      category(chargedTo),
-      startTime(getTimestamp()),
-      categoryTotalAtStart(category->total()),
-      key("time.detail." + category->getName()) {
-    if (key.isEnabled())
-        writeLine(key, "Entering " + name);
+    : category(chargedTo) {
+    if (enabled)
+        logEntry(label);
+    categoryTotalAtStart = PerformanceCategory::push(category, startTime);
+}
+
+Performance::Performance(const char* label, PerformanceCategory* chargedTo) : category(chargedTo) {
+    if (enabled)
+        logEntry(label);
     categoryTotalAtStart = PerformanceCategory::push(category, startTime);
 }
 
 Performance::~Performance() {
     const std::uint32_t now = getTimestamp();
-    const std::uint32_t inclusive = now - startTime;
     const std::uint32_t exclusive = PerformanceCategory::pop(now) - categoryTotalAtStart;
-    if (!key.isEnabled())
-        return;
+    if (enabled)
+        logExit(now - startTime, exclusive);
+}
+
+void Performance::logEntry(const std::string& label) {
+    name = label;
+    writeLine(category->detailTag.getTag(), "Entering " + name);
+}
+
+void Performance::logExit(std::uint32_t inclusive, std::uint32_t exclusive) const {
     std::ostringstream message;
     message << "Leaving  " << name << " (" << inclusive << " uS, " << exclusive << " uS in "
             << category->getName() << ')';
-    writeLine(key, message.str());
+    writeLine(category->detailTag.getTag(), message.str());
 }
 
 std::uint32_t Performance::getTimestamp() {
     static const std::uint64_t frequency = platform::counterFrequency();
-    return static_cast<std::uint32_t>(platform::counter() * 1000000u / frequency);
+    const std::uint64_t ticks = platform::counter();
+    // Most counters tick in microseconds; dividing 64 bits would cost a good part of a reading.
+    const bool inMicroseconds = frequency == 1000000u;
+    return static_cast<std::uint32_t>(inMicroseconds ? ticks : ticks * 1000000u / frequency);
 }
 
 }  // namespace pells

@@ -43,10 +43,13 @@ public:
     static std::uint32_t pop(std::uint32_t t);
 
 private:
+    friend class Performance;
+
     static std::vector<PerformanceCategory*>& _stack();
 
     std::uint32_t startTime = 0;
     std::uint32_t totalTime = 0;
+    RecurringTag detailTag;
 };
 
 /// Charges the time from its construction to its destruction to a category.
@@ -57,22 +60,28 @@ private:
 /// exits, a log that still exists receives the totals of all categories under "time.summary".
 class PELLS_API Performance {
 public:
-    /// \param label          names the probe in the log.
-    /// \param chargedTo      not null; not owned.
+    /// Registers the category's tag once more.
+    ///
+    /// \param label     names the probe in the log; copied if the tag is on, else not looked at.
+    /// \param chargedTo not null; not owned.
     /// \throws Prefs::NoImplementation as LogKey does.
     Performance(const std::string& label, PerformanceCategory* chargedTo);
+    Performance(const char* label, PerformanceCategory* chargedTo);
     ~Performance();
     Performance(const Performance&) = delete;
     Performance& operator=(const Performance&) = delete;
 
 private:
     static std::uint32_t getTimestamp();
+    void logEntry(const std::string& label);
+    void logExit(std::uint32_t inclusive, std::uint32_t exclusive) const;
 
+    // Empty while the tag is off.
     std::string name;
     PerformanceCategory* category;
-    std::uint32_t startTime;
+    std::uint32_t startTime = getTimestamp();
+    bool enabled = category->detailTag.registerOnceMore();
     std::uint32_t categoryTotalAtStart;
-    LogKey key;
 };
 
 }  // namespace pells

@@ -23,7 +23,8 @@ UndoRedoSequence& UndoRedoSequence::operator=(const UndoRedoSequence&) = default
 UndoRedoSequence::~UndoRedoSequence() = default;
 
 void UndoRedoSequence::addUndoable(boost::intrusive_ptr<UndoableStep> step) {
-    clearRedoStack();
+    if (getRedoStackSize() > 0)
+        clearRedoStack();
     steps.push_back(std::move(step));
     current = static_cast<int>(steps.size()) - 1;
 }
@@ -33,33 +34,8 @@ void UndoRedoSequence::addRedoable(boost::intrusive_ptr<UndoableStep> step) {
     current = std::max(current, allUndone);
 }
 
-bool UndoRedoSequence::undo() {
-    if (current < 0)
-        return false;
-    const bool undone = getLast()->undo();
-    if (undone)
-        --current;
-    return undone;
-}
-
-bool UndoRedoSequence::redo() {
-    if (getRedoStackSize() == 0)
-        return false;
-    ++current;
-    const boost::intrusive_ptr<UndoableStep> step = getLast();
-    return step->redoSuppressed() || step->redo();
-}
-
 boost::intrusive_ptr<UndoableStep> UndoRedoSequence::getLast() const {
-    return current < 0 ? nullptr : steps[static_cast<Steps::size_type>(current)];
-}
-
-int UndoRedoSequence::getUndoStackSize() const {
-    return std::max(current + 1, 0);
-}
-
-int UndoRedoSequence::getRedoStackSize() const {
-    return static_cast<int>(steps.size()) - getUndoStackSize();
+    return current < 0 ? nullptr : stepAt(current);
 }
 
 void UndoRedoSequence::clearRedoStack() {
@@ -80,8 +56,7 @@ void UndoRedoSequence::merge(UndoRedoSequence* other, const IdHandler& ids) {
         return;
     clearRedoStack();
     for (int i = 0; i < other->getUndoStackSize(); ++i) {
-        const boost::intrusive_ptr<UndoableStep>& step =
-            other->steps[static_cast<Steps::size_type>(i)];
+        const boost::intrusive_ptr<UndoableStep>& step = other->stepAt(i);
         step->updateId(ids);
         steps.push_back(step);
     }
@@ -112,7 +87,7 @@ bool UndoRedoSequence::applyToAll(const BatchMethod& method, bool forward) const
 bool UndoRedoSequence::apply(const BatchMethod& method, int count, bool forward) const {
     for (int i = 0; i < count; ++i) {
         const int index = forward ? i : count - 1 - i;
-        if (!method(steps[static_cast<Steps::size_type>(index)]))
+        if (!method(stepAt(index)))
             return false;
     }
     return true;

@@ -43,8 +43,8 @@ public:
     /// The last step that is done, or null.
     boost::intrusive_ptr<UndoableStep> getLast() const;
 
-    int getUndoStackSize() const;
-    int getRedoStackSize() const;
+    int getUndoStackSize() const { return current < 0 ? 0 : current + 1; }
+    int getRedoStackSize() const { return static_cast<int>(steps.size()) - getUndoStackSize(); }
 
     /// Discards the undone steps after calling destroy() on each, the next to redo first.
     void clearRedoStack();
@@ -82,11 +82,35 @@ public:
 private:
     typedef std::vector<boost::intrusive_ptr<UndoableStep>> Steps;
 
+    const boost::intrusive_ptr<UndoableStep>& stepAt(int index) const {
+        return steps[static_cast<Steps::size_type>(index)];
+    }
     bool apply(const BatchMethod& method, int count, bool forward) const;
     void acceptLoadedSteps();
 
     Steps steps;
     int current;
 };
+
+inline bool UndoRedoSequence::undo() {
+    if (current < 0)
+        return false;
+    UndoableStep& step = *stepAt(current);
+    // The step may make the history let go of it.
+    const KeptAlive kept(step);
+    const bool undone = step.undo();
+    if (undone)
+        --current;
+    return undone;
+}
+
+inline bool UndoRedoSequence::redo() {
+    if (getRedoStackSize() == 0)
+        return false;
+    ++current;
+    UndoableStep& step = *stepAt(current);
+    const KeptAlive kept(step);
+    return step.redoSuppressed() || step.redo();
+}
 
 }  // namespace pells

@@ -1,0 +1,1 @@
+pells_add_bench(bench_timing SOURCES timing.cpp)
