@@ -1,12 +1,12 @@
 // Any document loaded into an object with members of every kind. Whatever it ends with, the object
 // stays usable; and once it was saved and loaded, saving gives the same document again.
 
-#include "fuzz/support/everything.h"
 #include "fuzz/support/fuzz.h"
+#include "support/everything.h"
 
-using pells_fuzz::Everything;
-using pells_fuzz::load;
-using pells_fuzz::saved;
+using pells_test::Everything;
+using pells_test::load;
+using pells_test::saved;
 
 namespace {
 

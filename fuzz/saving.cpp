@@ -4,10 +4,10 @@
 
 #include <cmath>
 
-#include "fuzz/support/everything.h"
 #include "fuzz/support/fuzz.h"
+#include "support/everything.h"
 
-using pells_fuzz::Everything;
+using pells_test::Everything;
 
 namespace {
 
@@ -41,7 +41,7 @@ void fill(Everything& object, FuzzedDataProvider& source, int depth) {
         object.matrices.emplace_back(source.ConsumeIntegralInRange(0, 3), anyNumber<float>(source));
     object.material.setTextureData(anyText(source), anyNumber<float>(source), 0);
     while (source.ConsumeBool()) {
-        boost::intrusive_ptr<pells_fuzz::CountingStep> step(new pells_fuzz::CountingStep);
+        boost::intrusive_ptr<pells_test::CountingStep> step(new pells_test::CountingStep);
         step->label = anyText(source);
         object.history.addUndoable(step);
     }
@@ -74,6 +74,6 @@ void fuzzOne(const std::string& input) {
     Everything object;
     fill(object, source, 0);
     Everything loaded;
-    pells_fuzz::load(loaded, pells_fuzz::saved(object, 17));
+    pells_test::load(loaded, pells_test::saved(object, 17));
     pells_fuzz::require(equal(object, loaded), "what is saved loads back equal");
 }

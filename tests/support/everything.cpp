@@ -1,10 +1,10 @@
-#include "fuzz/support/everything.h"
+#include "support/everything.h"
 
 #include <sstream>
 
 #include "pells/xml/tag.h"
 
-namespace pells_fuzz {
+namespace pells_test {
 
 namespace {
 
@@ -39,6 +39,7 @@ boost::intrusive_ptr<pells::Field> Everything::getField(const std::string& name)
 std::string saved(pells::Serializable& object, int precision) {
     std::ostringstream out;
     out.precision(precision);
+    out.exceptions(std::ios_base::badbit);
     pells::OutTag tag(out, "root");
     object.save(tag);
     return out.str();
@@ -58,4 +59,4 @@ void load(pells::Serializable& object, const std::string& document) {
     }
 }
 
-}  // namespace pells_fuzz
+}  // namespace pells_test

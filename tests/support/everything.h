@@ -9,7 +9,7 @@
 #include "pells/serial/member_field.h"
 #include "pells/undo/undo_redo_sequence.h"
 
-namespace pells_fuzz {
+namespace pells_test {
 
 /// A step of a history that counts how often it is replayed.
 class CountingStep : public pells::UndoableStep {
@@ -54,4 +54,4 @@ std::string saved(pells::Serializable& object, int precision = 6);
 /// \throws pells::Serializable::LoadFail for a document that cannot be read, without tags too.
 void load(pells::Serializable& object, const std::string& document);
 
-}  // namespace pells_fuzz
+}  // namespace pells_test

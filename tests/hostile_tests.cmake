@@ -1,0 +1,6 @@
+# Each replaces operator new.
+pells_add_test(allocation_failure_test
+    SOURCES allocation_failure_test.cpp support/allocations.cpp support/everything.cpp
+    LIBRARIES Boost::filesystem)
+pells_add_test(proportion_test
+    SOURCES proportion_test.cpp support/allocations.cpp support/everything.cpp)

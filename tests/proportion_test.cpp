@@ -1,0 +1,172 @@
+// Memory in proportion to what is there, not to what it claims.
+
+#include <gtest/gtest.h>
+
+#include <sstream>
+
+#include "pells/asset/pell_archive.h"
+#include "pells/image/image_base.h"
+#include "pells/image/image_loaders.h"
+#include "pells/serial/serializable.h"
+#include "support/allocations.h"
+#include "support/archive_bytes.h"
+#include "support/everything.h"
+#include "support/test_prefs.h"
+#include "support/tga_file.h"
+
+namespace {
+
+using pells_test::AllocationMeter;
+typedef pells::XMLTokenizer::Token Token;
+
+const std::int64_t KiB = 1024;
+const std::int64_t MiB = 1024 * KiB;
+
+/// The head, then a piece so many times, then the tail, without ever holding them.
+class RepeatedText : public std::streambuf {
+public:
+    RepeatedText(std::string head, const std::string& piece, std::int64_t times, std::string tail)
+        : first(std::move(head)), last(std::move(tail)), repeats(times) {
+        const std::int64_t most = std::max<std::int64_t>(1, 64 * KiB / std::int64_t(piece.size()));
+        piecesInBlock = std::min(most, repeats);
+        for (std::int64_t i = 0; i < piecesInBlock; ++i)
+            block += piece;
+        show(first, first.size());
+    }
+
+protected:
+    int_type underflow() override {
+        if (repeats > 0) {
+            const std::int64_t pieces = std::min(repeats, piecesInBlock);
+            repeats -= pieces;
+            show(block, block.size() / std::size_t(piecesInBlock) * std::size_t(pieces));
+        } else if (!last.empty()) {
+            shown.swap(last);
+            last.clear();
+            show(shown, shown.size());
+        } else {
+            return traits_type::eof();
+        }
+        return traits_type::to_int_type(*gptr());
+    }
+
+private:
+    void show(std::string& text, std::size_t count) { setg(&text[0], &text[0], &text[0] + count); }
+
+    std::string first;
+    std::string last;
+    std::string shown;
+    std::string block;
+    std::int64_t repeats;
+    std::int64_t piecesInBlock = 0;
+};
+
+class Proportion : public pells_test::LibraryTest {
+protected:
+    /// Tokenizes the stream; returns the most memory it took.
+    static std::int64_t peakOfTokens(std::istream& in, std::int64_t tokens) {
+        const AllocationMeter meter;
+        pells::XMLTokenizer tokenizer(in);
+        std::int64_t count = 0;
+        while (tokenizer.getToken().type != Token::T_EOF)
+            ++count;
+        EXPECT_EQ(count, tokens);
+        return meter.peakBytes();
+    }
+
+    /// Opens an archive and reads a member in blocks; returns the most memory it took.
+    std::int64_t peakOfArchive(const std::string& bytes, const std::string& member,
+                               std::int64_t expected) const {
+        const std::string path = pells_test::writeArchiveFile(scratch, bytes);
+        std::int64_t total = 0;
+        char into[8192];
+        const AllocationMeter meter;
+        pells::pellistream archive(path);
+        EXPECT_TRUE(archive.open(member));
+        try {
+            do {
+                archive.read(into, sizeof into);
+                total += archive.gcount();
+            } while (archive);
+        } catch (const pells::pellibuf::BadPellFile&) {
+            total = -1;
+        }
+        EXPECT_EQ(total, expected);
+        return meter.peakBytes();
+    }
+};
+
+TEST_F(Proportion, OfAPictureThatIsClaimedButNotThere) {
+    pells::Image_base image(1, 1);
+    for (const int depth : {8, 24, 32}) {
+        std::istringstream in(pells_test::tgaHeader(65535, 65535, depth));
+        const AllocationMeter meter;
+        EXPECT_FALSE(pells::TGAFileLoader::loadTarga(&image, in));
+        EXPECT_LT(meter.peakBytes(), MiB);
+    }
+}
+
+TEST_F(Proportion, OfDirectories) {
+    const std::string entry = "O15 Lffffffff |" + std::string(100 * MiB, 'n') + "\r\n";
+    const std::string longName = scratch.write("n.pell", pells_test::archiveWithDirectory(entry));
+    {
+        const AllocationMeter meter;
+        EXPECT_EQ(pells::pellistream(longName).getDirectory().size(), 1u);
+        EXPECT_LT(meter.peakBytes(), 4 * 100 * MiB);
+    }
+
+    std::string emptyNames;
+    for (int i = 0; i < 1000000; ++i)
+        emptyNames += "O15 L0 |\r\n";
+    const std::int64_t size = static_cast<std::int64_t>(emptyNames.size());
+    EXPECT_LT(peakOfArchive(pells_test::archiveWithDirectory(emptyNames), "", 0), 2 * size + MiB);
+}
+
+TEST_F(Proportion, OfMembersThatInflateAThousandfold) {
+    const std::int64_t size = 100 * MiB;
+    const std::string bytes = pells_test::archiveOf({{"bomb", std::string(size, '\0')}});
+    EXPECT_LT(bytes.size(), std::size_t(size / 900));
+    EXPECT_LT(peakOfArchive(bytes, "bomb", size), 512 * KiB);
+}
+
+TEST_F(Proportion, OfTokens) {
+    RepeatedText text("<a>", "0123456789 ", 10 * MiB, "</a>");
+    std::istream longText(&text);
+    EXPECT_LT(peakOfTokens(longText, 3), 3 * 110 * MiB);
+
+    RepeatedText comments("<a>", "<!-- a comment -->   \n", MiB, "</a>");
+    std::istream onlyComments(&comments);
+    EXPECT_LT(peakOfTokens(onlyComments, 2), 64 * KiB);
+
+    const std::int64_t count = 1000000;
+    const std::string attribute = " a='1'";
+    RepeatedText tag("<a", attribute, count, "/>");
+    std::istream manyAttributes(&tag);
+    const std::int64_t held = static_cast<std::int64_t>(sizeof(Token::Attribute)) * count;
+    EXPECT_LT(peakOfTokens(manyAttributes, 1), 4 * held);
+}
+
+TEST_F(Proportion, OfElementsInsideElements) {
+    pells_test::Everything object;
+    const auto peakOfLoading = [&object](std::streambuf& text, const std::string& message) {
+        std::istream in(&text);
+        const AllocationMeter meter;
+        try {
+            pells::XMLTokenizer tokenizer(in);
+            pells::OpenTag root(tokenizer, tokenizer.getToken());
+            object.load(root, nullptr);
+            ADD_FAILURE() << "expected " << message;
+        } catch (const pells::Serializable::LoadFail& failure) {
+            EXPECT_EQ(failure.what(), message);
+        }
+        return meter.peakBytes();
+    };
+    // The names of the elements that are open have to be known, and nothing else.
+    RepeatedText unknown("<root>", "<u>", 10000000, "");
+    EXPECT_LT(peakOfLoading(unknown, "Malformed XML: premature EOF"), 3 * 20 * MiB);
+
+    RepeatedText known("<root>", "<child class='Everything'>", 10000000, "");
+    EXPECT_LT(peakOfLoading(known, "Malformed XML: nested too deeply"), 4 * MiB);
+}
+
+}  // namespace
