@@ -4,3 +4,4 @@ pells_add_test(allocation_failure_test
     LIBRARIES Boost::filesystem)
 pells_add_test(proportion_test
     SOURCES proportion_test.cpp support/allocations.cpp support/everything.cpp)
+pells_add_test(world_faults_test SOURCES world_faults_test.cpp LIBRARIES Boost::filesystem)
