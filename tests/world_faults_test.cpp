@@ -148,4 +148,42 @@ TEST_F(WorldFaults, PipesInTheRootBlockNothing) {
     EXPECT_TRUE(pells::ImageFallbackManager::instance().getImageNames().empty());
 }
 
+/// Logs when it is freed.
+class Mourner : public pells::Singleton<Mourner> {
+public:
+    ~Mourner() override { PELLS_LOG("app", "farewell"); }
+};
+
+TEST_F(WorldFaults, SingletonsMayLogWhenTheyDie) {
+    PELLS_LOG("app", "a log comes first");
+    Mourner::instance();
+    pells::SingletonList::freeSingletons();
+    EXPECT_EQ(linesUnder("app"), (std::vector<std::string>{"a log comes first", "farewell"}));
+
+    // Here the log dies first, and another one is made for the farewell.
+    Mourner::instance();
+    PELLS_LOG("app", "a log comes second");
+    pells::SingletonList::freeSingletons();
+    EXPECT_EQ(linesUnder("app"), std::vector<std::string>{"farewell"});
+    EXPECT_EQ(pells::Log::singleton, nullptr);
+}
+
+#ifndef NDEBUG
+TEST_F(WorldFaults, ContainersThatOutliveTheManagerAreReported) {
+    Sink sink;
+    pells::platform::setDebuggerSink(&sink);
+    pells_test::prefs() = {{"log", "-*"}, {"assetLocation", "root"}};
+    writeArchive("a.asset", {{"name", "content"}});
+    auto container = manager().getFileStream("name", true);
+    pells::SingletonList::freeSingletons();
+    EXPECT_NE(sink.received.find("Stream containers outlive the asset manager\n"),
+              std::string::npos);
+    container = nullptr;
+    sink.received.clear();
+    manager().getFileStream("name", true);
+    pells::SingletonList::freeSingletons();
+    EXPECT_EQ(sink.received.find("Stream containers"), std::string::npos);
+}
+#endif
+
 }  // namespace

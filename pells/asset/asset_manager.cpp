@@ -11,6 +11,7 @@
 #include "pells/core/class_name.h"
 #include "pells/core/prefs.h"
 #include "pells/log/log.h"
+#include "pells/platform/debugger.h"
 
 namespace pells {
 
@@ -65,6 +66,27 @@ private:
     std::string folder;
     bool missing = false;
 };
+
+/// A container on a member of an archive; how many there are is counted.
+class MemberContainer : public iExistingStreamContainer {
+public:
+    explicit MemberContainer(std::istream& archive) : iExistingStreamContainer(archive) { ++alive; }
+    MemberContainer(const MemberContainer&) = delete;
+    MemberContainer& operator=(const MemberContainer&) = delete;
+    ~MemberContainer() override { --alive; }
+
+    static int alive;
+};
+
+int MemberContainer::alive = 0;
+
+/// Tells developers of streams that will read from archives that are gone.
+void reportContainersLeft() {
+#ifndef NDEBUG
+    if (MemberContainer::alive != 0)
+        platform::debuggerOutput("Stream containers outlive the asset manager\n");
+#endif
+}
 
 }  // namespace
 
@@ -121,6 +143,7 @@ AssetManager::AssetManager() {
 }
 
 AssetManager::~AssetManager() {
+    reportContainersLeft();
     archives.clear();
 }
 
@@ -375,7 +398,7 @@ AssetManager::MemberOpener::~MemberOpener() = default;
 boost::intrusive_ptr<baseiStreamContainer> AssetManager::MemberOpener::open(bool /*flag*/) {
     if (!archive->open(getName()))
         return nullptr;
-    return boost::intrusive_ptr<baseiStreamContainer>(new iExistingStreamContainer(*archive));
+    return boost::intrusive_ptr<baseiStreamContainer>(new MemberContainer(*archive));
 }
 
 }  // namespace pells

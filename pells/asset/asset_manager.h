@@ -54,7 +54,8 @@ public:
     class MemberOpener;
     struct Resolution;
 
-    /// Closes the archives; stream containers on their members must be gone.
+    /// Closes the archives; stream containers on their members must be gone. A debug build of the
+    /// library tells the debugger if they are not.
     ~AssetManager() override;
 
     /// The name with every "\" replaced by "/" and nothing else changed.
