@@ -36,19 +36,21 @@ ImageFallbackManager::ImageFallbackManager() {
     }
     try {
         readDefinitions(file->getStream());
+        for (const FallbackEntry& entry : imageEntries) {
+            if (!entry.getters.empty())
+                loadersByName[entry.name] = entry.getters;
+        }
     } catch (...) {
         adoptLoaders();
+        releaseLoaders();
         throw;
     }
     adoptLoaders();
-    for (const FallbackEntry& entry : imageEntries) {
-        if (!entry.getters.empty())
-            loadersByName[entry.name] = entry.getters;
-    }
-    imageEntries.clear();
 }
 
-ImageFallbackManager::~ImageFallbackManager() = default;
+ImageFallbackManager::~ImageFallbackManager() {
+    releaseLoaders();
+}
 
 void ImageFallbackManager::readDefinitions(std::istream& in) {
     XMLTokenizer tokenizer(in);
@@ -67,9 +69,23 @@ void ImageFallbackManager::readDefinitions(std::istream& in) {
 }
 
 /// Takes hold of all loaders that were read, those of half-read and replaced entries included.
-void ImageFallbackManager::adoptLoaders() {
-    for (const FallbackEntry& entry : imageEntries)
-        ownedLoaders.insert(ownedLoaders.end(), entry.getters.begin(), entry.getters.end());
+void ImageFallbackManager::adoptLoaders() noexcept {
+    definitions.swap(imageEntries);
+    for (const FallbackEntry& entry : definitions) {
+        for (ImageLoaderBase* const loader : entry.getters) {
+            if (loader)
+                intrusive_ptr_add_ref(loader);
+        }
+    }
+}
+
+void ImageFallbackManager::releaseLoaders() noexcept {
+    for (const FallbackEntry& entry : definitions) {
+        for (ImageLoaderBase* const loader : entry.getters) {
+            if (loader)
+                intrusive_ptr_release(loader);
+        }
+    }
 }
 
 int ImageFallbackManager::getFallbackImage(Image_base* image, const std::string& name,

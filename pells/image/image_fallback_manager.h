@@ -104,11 +104,12 @@ private:
     ImageFallbackManager();
 
     void readDefinitions(std::istream& in);
-    void adoptLoaders();
+    void adoptLoaders() noexcept;
+    void releaseLoaders() noexcept;
 
     std::vector<FallbackEntry> imageEntries;  ///< while the definitions are read
+    std::vector<FallbackEntry> definitions;   ///< then; keeps every loader
     std::map<std::string, std::vector<ImageLoaderBase*>> loadersByName;
-    std::vector<boost::intrusive_ptr<ImageLoaderBase>> ownedLoaders;
 };
 
 }  // namespace pells

@@ -67,8 +67,11 @@ public:
                   sizeof...(Pointers) != 0 &&
                   (std::is_convertible_v<Pointers, boost::intrusive_ptr<Field>> && ...)>>
     explicit ClassDesc(Pointers&&... each) {
+        // Fields that were just made are owned before anything here can throw.
+        boost::intrusive_ptr<Field> owned[] = {std::forward<Pointers>(each)...};
         reserve(sizeof...(Pointers));
-        (add(std::forward<Pointers>(each)), ...);
+        for (boost::intrusive_ptr<Field>& field : owned)
+            add(std::move(field));
     }
 };
 

@@ -39,7 +39,33 @@ void operator delete(void* memory) noexcept {
     std::free(memory);
 }
 
+// The others come down to those two by the standard, but a sanitizer brings its own of each.
+
+void* operator new(std::size_t size, const std::nothrow_t& /*tag*/) noexcept {
+    try {
+        return operator new(size);
+    } catch (const std::bad_alloc&) {
+        return nullptr;
+    }
+}
+
+void* operator new[](std::size_t size) {
+    return operator new(size);
+}
+
+void* operator new[](std::size_t size, const std::nothrow_t& tag) noexcept {
+    return operator new(size, tag);
+}
+
 void operator delete(void* memory, std::size_t /*size*/) noexcept {
+    operator delete(memory);
+}
+
+void operator delete[](void* memory) noexcept {
+    operator delete(memory);
+}
+
+void operator delete[](void* memory, std::size_t /*size*/) noexcept {
     operator delete(memory);
 }
 
