@@ -1,26 +1,20 @@
-#include <gtest/gtest.h>
-
-#include <algorithm>
-
 #include "support/asset_root.h"
 
 namespace {
 
 namespace fs = boost::filesystem;
-typedef std::vector<std::string> Lines;
+using namespace pells_test;
 
-class AliasTest : public pells_test::AssetRootTest {
+class AliasTest : public AssetRootTest {
 protected:
     ~AliasTest() override { pells::AssetManager::setAliasLimit(1000000); }
 
     /// The asset that a name stands for, or "".
     static std::string aliasOf(const std::string& name) { return manager().resolve(name).alias; }
 
-    static long count(const std::string& tag, const std::string& start) {
-        const Lines lines = linesUnder(tag);
-        return std::count_if(lines.begin(), lines.end(), [&start](const std::string& line) {
-            return line.compare(0, start.size(), start) == 0;
-        });
+    static void expectTooMany(const std::string& limit) {
+        EXPECT_EQ(logLines("error: Too many aliases for the limit of "),
+                  Lines{limit + ", some are dropped"});
     }
 };
 
@@ -39,9 +33,7 @@ TEST_F(AliasTest, ReachFilesThroughLinksOfFoldersAndInside) {
     EXPECT_FALSE(manager().isDir("pics"));
     EXPECT_EQ(manager().listfiles("pics", false), Lines());
 
-    Lines lines = linesUnder("asset.alias");
-    std::sort(lines.begin(), lines.end());
-    EXPECT_EQ(lines,
+    EXPECT_EQ(sorted(logLines("asset.alias: ")),
               (Lines{"  'oak.tga' ==> 'wood.tga'", "  'pics' ==> 'textures'", "End   .symlinks",
                      "End   textures/.symlinks", "Found .symlinks", "Found textures/.symlinks",
                      "Making new DirNode for ''", "Making new DirNode for 'textures'",
@@ -50,14 +42,12 @@ TEST_F(AliasTest, ReachFilesThroughLinksOfFoldersAndInside) {
                      "Mapping 'pics/plain.tga' to 'textures/plain.tga'",
                      "Mapping 'pics/wood.tga' to 'textures/wood.tga'",
                      "Mapping 'textures/oak.tga' to 'textures/wood.tga'"}));
-    const Lines opened = linesUnder("asset.open");
-    const std::string start = "AssetManager::getFileStream(pics/";
-    const auto has = [&opened](const std::string& line) {
-        return std::count(opened.begin(), opened.end(), line) == 1;
-    };
-    EXPECT_TRUE(has(start + "oak.tga): not in cache, but alias is: textures/wood.tga"));
-    EXPECT_TRUE(has(start + "plain.tga): alias not in cache: textures/plain.tga"));
-    EXPECT_TRUE(has(start + "plain.tga): textures/plain.tga not in cache, trying filesystem"));
+    const std::string start = "asset.open: AssetManager::getFileStream(pics/";
+    for (const char* const line :
+         {"oak.tga): not in cache, but alias is: textures/wood.tga",
+          "plain.tga): alias not in cache: textures/plain.tga",
+          "plain.tga): textures/plain.tga not in cache, trying filesystem"})
+        EXPECT_EQ(logLines(start + line), Lines{""}) << line;
 }
 
 TEST_F(AliasTest, LinesSplitAtRunsOfTheSign) {
@@ -74,14 +64,13 @@ TEST_F(AliasTest, LinesSplitAtRunsOfTheSign) {
     EXPECT_EQ(aliasOf("z"), "c") << "the link entered last wins";
     EXPECT_EQ(aliasOf("k/x"), "d/x");
     EXPECT_EQ(aliasOf("k/CVS/y"), "");
-    const Lines lines = linesUnder("asset.alias");
     for (const char* const line : {"  ??: 'f'", "  ??: 'g>b>c'", "  ??: ''", "  'h ' ==> ' b\r'"})
-        EXPECT_EQ(std::count(lines.begin(), lines.end(), line), 1) << line;
+        EXPECT_EQ(logLines(std::string("asset.alias: ") + line), Lines{""}) << line;
 }
 
 TEST_F(AliasTest, ADamagedLinkFileEndsTheConstruction) {
-    std::string bytes = pells_test::archiveOf({{".symlinks", "a>b"}});
-    bytes[pells_test::archiveHeaderSize] = '\0';
+    std::string bytes = archiveOf({{".symlinks", "a>b"}});
+    bytes[archiveHeaderSize] = '\0';
     write("a.asset", bytes);
     EXPECT_THROW(manager(), pells::ZlibWrapper::ZlibError);
     EXPECT_EQ(pells::AssetManager::singleton, nullptr);
@@ -103,18 +92,9 @@ TEST_F(AliasTest, LinksOfTheFileSystemAreFollowedButNeverInCircles) {
     EXPECT_EQ(aliasOf("a/c/y"), "a/c/x");
     EXPECT_EQ(aliasOf("here/here/n"), "here/here/m");
     EXPECT_EQ(read("/x/y"), "rooted");
-    Lines folders = linesUnder("asset.alias");
-    folders.erase(std::remove_if(folders.begin(), folders.end(),
-                                 [](const std::string& line) {
-                                     return line[0] != 'M' || line[1] != 'a' || line[2] != 'k';
-                                 }),
-                  folders.end());
-    std::sort(folders.begin(), folders.end());
-    Lines expected;
-    for (const char* const path :
-         {"", "a", "a/.", "a/./.", "a/././.", "a/./././b", "a/b", "a/c", "here", "here/here"})
-        expected.push_back("Making new DirNode for '" + std::string(path) + "'");
-    EXPECT_EQ(folders, expected);
+    EXPECT_EQ(sorted(logLines("asset.alias: Making new DirNode for ")),
+              (Lines{"''", "'a'", "'a/.'", "'a/./.'", "'a/././.'", "'a/./././b'", "'a/b'", "'a/c'",
+                     "'here'", "'here/here'"}));
 }
 
 TEST_F(AliasTest, StopAtTheLimitWithOneLine) {
@@ -122,13 +102,13 @@ TEST_F(AliasTest, StopAtTheLimitWithOneLine) {
     writeArchive("a.asset", {{"f", "f"}, {".symlinks", "a>f\nb>f\nc>f\nd>f\ne>f\n"}});
     EXPECT_EQ(aliasOf("c"), "f");
     EXPECT_EQ(aliasOf("d"), "");
-    EXPECT_EQ(count("error", "Too many aliases for the limit of 3, some are dropped"), 1);
+    expectTooMany("3");
 }
 
 /// What strangers may declare: each of these would take hours or all memory.
 class AliasBomb : public AliasTest {
 protected:
-    AliasBomb() { pells_test::prefs()["log"] = "error"; }
+    AliasBomb() { prefs()["log"] = "error"; }
 };
 
 TEST_F(AliasBomb, LinksThatDoubleWithEveryLevel) {
@@ -143,7 +123,7 @@ TEST_F(AliasBomb, LinksThatDoubleWithEveryLevel) {
         writeArchive("a.asset", members);
         pells::AssetManager::setAliasLimit(10000);
         EXPECT_EQ(read(folder + "x"), "x");
-        EXPECT_EQ(count("error", "Too many aliases for the limit of 10000"), 1);
+        expectTooMany("10000");
         pells::SingletonList::freeSingletons();
     }
 }
@@ -158,8 +138,8 @@ TEST_F(AliasBomb, DeepFoldersAndEndlessLines) {
     writeArchive("a.asset", {{deep + "x", "x"}, {"f", "f"}, {".symlinks", endless + "\nb>f\n"}});
     EXPECT_EQ(read(deep + "x"), "x");
     EXPECT_EQ(aliasOf("a"), "f");
-    EXPECT_EQ(count("error", "Folder is nested too deeply to look for aliases: d/"), 1);
-    EXPECT_EQ(count("error", "Too many aliases for the limit of 1000"), 1);
+    EXPECT_EQ(logLines("error: Folder is nested too deeply to look for aliases: d/").size(), 1u);
+    expectTooMany("1000");
 }
 
 }  // namespace

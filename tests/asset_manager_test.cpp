@@ -1,7 +1,5 @@
 #include "pells/asset/asset_manager.h"
 
-#include <gtest/gtest.h>
-
 #include <algorithm>
 #include <limits>
 #include <random>
@@ -12,17 +10,17 @@
 namespace {
 
 namespace fs = boost::filesystem;
+using namespace pells_test;
 typedef pells::AssetManager::Resolution Resolution;
-typedef std::vector<std::string> Lines;
 
-class AssetManagerTest : public pells_test::AssetRootTest {};
+class AssetManagerTest : public AssetRootTest {};
 
 TEST_F(AssetManagerTest, LogsWhatItFindsAndOpens) {
     writeArchive("a.asset", {{"dir/x", "x"}});
     EXPECT_EQ(read("dir\\x"), "x");
     EXPECT_EQ(read("none"), "(null)");
     const std::string opening = "asset.open: AssetManager::getFileStream(";
-    EXPECT_EQ(pells_test::logLines(),
+    EXPECT_EQ(logLines(),
               (Lines{
                   "asset.iter: Found root/a.asset",
                   "asset.entries: >>> For this asset file, found entry: dir/x",
@@ -53,17 +51,17 @@ TEST_F(AssetManagerTest, SkipsWhatIsNoArchive) {
     fs::create_directory("root/d.asset");
     fs::create_symlink("e.asset", "root/e.asset");
     EXPECT_EQ(read("b.asset"), "no archive");
-    Lines scan = linesUnder("asset.iter");
+    Lines scan = logLines("asset.iter: ");
     scan.resize(6);
-    std::sort(scan.begin(), scan.end());
-    EXPECT_EQ(scan, (Lines{"  which is a directory, skipping",
-                           "  which isn't a .asset file, skipping", "Found root/b.asset",
-                           "Found root/c.ASSET", "Found root/d.asset", "Found root/e.asset"}));
-    EXPECT_EQ(linesUnder("asset.ctor"), Lines{"Asset manager has no .asset files to check."});
-    const Lines errors = linesUnder("error");
-    for (const char* const line : {"Bad .asset file: root/b.asset: Input file not a pell file",
-                                   "Bad .asset file: root/e.asset: Can't open pell file"})
-        EXPECT_EQ(std::count(errors.begin(), errors.end(), line), 1) << line;
+    EXPECT_EQ(sorted(scan),
+              (Lines{"  which is a directory, skipping", "  which isn't a .asset file, skipping",
+                     "Found root/b.asset", "Found root/c.ASSET", "Found root/d.asset",
+                     "Found root/e.asset"}));
+    EXPECT_EQ(logLines("asset.ctor: "), Lines{"Asset manager has no .asset files to check."});
+    EXPECT_EQ(logLines("error: Bad .asset file: ").size(), 2u);
+    EXPECT_EQ(logLines("error: Bad .asset file: root/b.asset: "),
+              Lines{"Input file not a pell file"});
+    EXPECT_EQ(logLines("error: Bad .asset file: root/e.asset: "), Lines{"Can't open pell file"});
 }
 
 TEST_F(AssetManagerTest, ServesWhatWasWrittenLast) {
@@ -77,12 +75,11 @@ TEST_F(AssetManagerTest, ServesWhatWasWrittenLast) {
     write("end", "plain", beyond32Bits + 1);
     write("only", "plain");
 
-    EXPECT_EQ(read("both"), "c");
-    EXPECT_EQ(read("file"), "plain");
-    EXPECT_EQ(read("sub/old"), "a");
-    EXPECT_EQ(read("end"), "d");
-    EXPECT_EQ(read("only"), "plain");
-    EXPECT_EQ(read("/only"), "plain") << "a name that begins with / stays below the root";
+    const std::pair<const char*, const char*> served[] = {
+        {"both", "c"}, {"file", "plain"}, {"sub/old", "a"},
+        {"end", "d"},  {"only", "plain"}, {"/only", "plain"}};  // the last one below the root, too
+    for (const auto& each : served)
+        EXPECT_EQ(read(each.first), each.second) << each.first;
 
     const Resolution both = manager().resolve("both");
     EXPECT_EQ(both.source, Resolution::ARCHIVE_MEMBER);
@@ -94,7 +91,7 @@ TEST_F(AssetManagerTest, ServesWhatWasWrittenLast) {
     // Between archives of one time the scan decides, and its order is the file system's.
     const Resolution tie = manager().resolve("tie");
     EXPECT_TRUE(tie.tie);
-    const Lines scan = linesUnder("asset.iter");
+    const Lines scan = logLines("asset.iter: ");
     const auto first = std::find_if(scan.begin(), scan.end(), [](const std::string& line) {
         return line == "Found root/a.asset" || line == "Found root/b.asset";
     });
@@ -111,17 +108,15 @@ TEST_F(AssetManagerTest, ServesWhatWasWrittenLast) {
 
 TEST_F(AssetManagerTest, ReportsNamesThatTheFileSystemRefuses) {
     const std::string name(300, 'n');
-    writeArchive("a.asset", {{name, "long"}, {std::string("a.asset\0x", 9), "zero"}}, 1000);
+    const std::string zero("a.asset\0x", 9);
+    writeArchive("a.asset", {{name, "long"}, {zero, "zero"}}, 1000);
     EXPECT_EQ(read(name), "long");
-    EXPECT_EQ(read(std::string("a.asset\0x", 9)), "zero");
-    EXPECT_EQ(read(std::string("a.asset\0y", 9)), "(null)");
+    EXPECT_EQ(read(zero), "zero");
+    EXPECT_EQ(read(zero + "y"), "(null)");
     EXPECT_EQ(manager().listfiles(name, true), Lines());
-    const std::string start = "Can't get timestamp for file root/" + name + ": ";
-    EXPECT_EQ(linesUnder("error").at(0).substr(0, start.size()), start);
-    const Lines errors = linesUnder("error");
-    EXPECT_EQ(
-        errors.back().find("listfiles(" + name + ", dirs): Can't list directory in filesystem: "),
-        0u);
+    EXPECT_EQ(logLines("error: Can't get timestamp for file root/" + name + ": ").size(), 1u);
+    const std::string listing = "error: listfiles(" + name + ", dirs)";
+    EXPECT_EQ(logLines(listing + ": Can't list directory in filesystem: ").size(), 1u);
 }
 
 TEST_F(AssetManagerTest, MembersOfOneArchiveShareAStream) {
@@ -141,10 +136,10 @@ TEST_F(AssetManagerTest, MembersOfOneArchiveShareAStream) {
 }
 
 TEST_F(AssetManagerTest, ARootThatIsNotThereLeavesTheConstructor) {
-    pells_test::prefs()["assetLocation"] = "";
+    prefs()["assetLocation"] = "";
     EXPECT_THROW(manager(), fs::filesystem_error);
     EXPECT_EQ(pells::AssetManager::singleton, nullptr);
-    pells_test::prefs()["assetLocation"] = "root";
+    prefs()["assetLocation"] = "root";
     EXPECT_FALSE(manager().isFile("x"));
     EXPECT_TRUE(manager().isDir(""));
 }
@@ -153,25 +148,20 @@ TEST_F(AssetManagerTest, TellsFilesFromFoldersOnDiskAndInArchives) {
     writeArchive("a.asset", {{"d/e/x", ""}, {"d/y", ""}, {"d0", ""}, {"d.x/z", ""}, {"w\\v", ""}});
     write("d/y", "");
     write("d/f/u", "");
-    EXPECT_TRUE(manager().isFile("d\\y"));
-    EXPECT_TRUE(manager().isFile("d/f/u"));
-    EXPECT_FALSE(manager().isFile("d/f"));
+    for (const char* const file : {"d\\y", "d/y", "d/f/u", "d0"}) {
+        EXPECT_TRUE(manager().isFile(file));
+        EXPECT_FALSE(manager().isDir(file));
+    }
+    for (const char* const dir : {"d\\e", "d/f", "d.x"}) {
+        EXPECT_TRUE(manager().isDir(dir));
+        EXPECT_FALSE(manager().isFile(dir));
+    }
     EXPECT_FALSE(manager().isFile("w\\v"));
-    EXPECT_TRUE(manager().isDir("d\\e"));
-    EXPECT_TRUE(manager().isDir("d/f"));
-    EXPECT_FALSE(manager().isDir("d/y"));
-    EXPECT_FALSE(manager().isDir("d0"));
     EXPECT_EQ(manager().listfiles("d\\e", false), Lines{"x"});
-    EXPECT_EQ(linesUnder("asset.list").back(), "listfiles(d\\e, files): from cache: x");
+    EXPECT_EQ(logLines("asset.list: ").back(), "listfiles(d\\e, files): from cache: x");
 }
 
-/// Runs with every tag on and with none: folders are passed over only while no line is written.
-class AssetListing : public AssetManagerTest, public testing::WithParamInterface<const char*> {
-protected:
-    AssetListing() { pells_test::prefs()["log"] = GetParam(); }
-};
-
-TEST_P(AssetListing, ListsEachNameOnce) {
+TEST_F(AssetManagerTest, ListsEachNameOnce) {
     std::mt19937 random(11);
     std::vector<std::pair<std::string, std::string>> members;
     std::set<std::string> names;
@@ -189,40 +179,34 @@ TEST_P(AssetListing, ListsEachNameOnce) {
     }
     names.insert("a.asset");
 
+    // Real folders by another name: everything on disk is in them, too.
+    const std::map<std::string, std::pair<Lines, Lines>> onDisk = {
+        {".", {{"a.asset"}, {"a", "b", "folder"}}}, {"a/", {{"b", "new"}, {}}}};
     for (const std::string dir : {"", "a", "b", "a/a", "a/", ".", "folder", "none"}) {
-        std::set<std::string> files;
-        std::set<std::string> dirs;
+        std::set<std::string> expected[2];  // files and folders
         const std::string start = dir.empty() ? "" : dir + "/";
         for (const std::string& name : names) {
             if (name.compare(0, start.size(), start) != 0)
                 continue;
             const std::string::size_type slash = name.find('/', start.size());
-            if (slash == std::string::npos)
-                files.insert(name.substr(start.size()));
-            else
-                dirs.insert(name.substr(start.size(), slash - start.size()));
+            expected[slash != std::string::npos].insert(
+                name.substr(start.size(), slash - start.size()));
         }
-        Lines listedFiles = manager().listfiles(dir, false);
-        Lines listedDirs = manager().listfiles(dir, true);
-        std::sort(listedFiles.begin(), listedFiles.end());
-        std::sort(listedDirs.begin(), listedDirs.end());
-        if (dir == "." || dir == "a/") {
-            // Real folders by another name: everything on disk is in them, too.
-            const std::set<std::string> realDirs =
-                dir == "." ? std::set<std::string>{"a", "b", "folder"} : std::set<std::string>{};
-            dirs.insert(realDirs.begin(), realDirs.end());
-            const std::set<std::string> realFiles =
-                dir == "." ? std::set<std::string>{"a.asset"} : std::set<std::string>{"b", "new"};
-            files.insert(realFiles.begin(), realFiles.end());
+        if (onDisk.count(dir) != 0) {
+            expected[0].insert(onDisk.at(dir).first.begin(), onDisk.at(dir).first.end());
+            expected[1].insert(onDisk.at(dir).second.begin(), onDisk.at(dir).second.end());
         }
-        EXPECT_EQ(listedFiles, Lines(files.begin(), files.end())) << dir;
-        EXPECT_EQ(listedDirs, Lines(dirs.begin(), dirs.end())) << dir;
+        // Folders are passed over only while no line is written.
+        for (const char* const tags : {"*", "-*", "asset.list"}) {
+            pells::SingletonList::freeSingletons();
+            prefs()["log"] = tags;
+            for (const bool folders : {false, true}) {
+                EXPECT_EQ(sorted(manager().listfiles(dir, folders)),
+                          Lines(expected[folders].begin(), expected[folders].end()))
+                    << dir;
+            }
+        }
     }
 }
-
-INSTANTIATE_TEST_SUITE_P(
-    Tags, AssetListing, testing::Values("*", "-*", "asset.list"), [](const auto& run) {
-        return std::string(run.index == 0 ? "On" : run.index == 1 ? "Off" : "Some");
-    });
 
 }  // namespace

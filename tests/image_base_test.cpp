@@ -1,12 +1,9 @@
 #include "pells/image/image_base.h"
 
-#include <gtest/gtest.h>
-
 #include <cstring>
 #include <new>
 #include <random>
 #include <sstream>
-#include <vector>
 
 #include "pells/image/image_loaders.h"
 #include "pells/material/color.h"
@@ -15,15 +12,13 @@
 
 namespace {
 
-using pells::FMT_RGB;
-using pells::FMT_RGBA;
-using pells::Image_base;
-using pells_test::tgaFile;
+using namespace pells;
+using namespace pells_test;
 
 /// An image that a derived class fills.
 class TestImage : public Image_base {
 public:
-    TestImage(int pixelsWide, int pixelsHigh, pells::ImageFormat pixelFormat)
+    TestImage(int pixelsWide, int pixelsHigh, ImageFormat pixelFormat)
         : Image_base(pixelsWide, pixelsHigh) {
         format = pixelFormat;
         numComponents = pixelFormat == FMT_RGB ? 3 : 4;
@@ -34,26 +29,24 @@ public:
     using Image_base::makeBogusImage;
 };
 
-class GrayImage : public pells_test::LibraryTest {
+class GrayImage : public LibraryTest {
 protected:
     bool load(const std::string& file) {
         std::istringstream in(file);
-        return pells::TGAFileLoader::loadTarga(&image, in);
+        return TGAFileLoader::loadTarga(&image, in);
     }
 
     Image_base image{1, 1};
 };
 
-const pells::ImageFormat ownFormat = static_cast<pells::ImageFormat>(7);
-
-struct PackedPixel {
-    pells::ImageFormat format;
-    unsigned char bytes[4];
-    std::vector<std::uint32_t> packed;  // A8B8G8R8, A8R8G8B8, A1R5G5B5, A4R4G4B4, A8R3G3B2, A2B10..
-};
+const ImageFormat ownFormat = static_cast<ImageFormat>(7);
 
 TEST(Pixels, ArePackedWithTheLowBitsDropped) {
-    const PackedPixel pixels[] = {
+    const struct {
+        ImageFormat format;
+        unsigned char bytes[4];
+        std::vector<std::uint32_t> packed;  // ABGR, ARGB, A1R5G5B5, A4R4G4B4, A8R3G3B2, A2B10..
+    } pixels[] = {
         {FMT_RGB, {255, 255, 255}, {~0U, ~0U, 0xFFFF, 0xFFFF, 0xFFFF, 0xFFCFF3FC}},
         {FMT_RGB, {255, 128, 0}, {0xFF0080FF, 0xFFFF8000, 0xFE00, 0xFF80, 0xFFF0, 0xC00803FC}},
         {FMT_RGBA,
@@ -63,7 +56,7 @@ TEST(Pixels, ArePackedWithTheLowBitsDropped) {
         {FMT_RGBA, {18, 52, 86, 120}, {0x78563412, 0x78123456, 0x08CA, 0x7135, 0x7805, 0x55834048}},
         {ownFormat, {18, 52, 86, 248}, {0, 0, 0x88CA, 0xF135, 0xF805, 0}},
     };
-    for (const PackedPixel& each : pixels) {
+    for (const auto& each : pixels) {
         TestImage image(3, 2, each.format);
         const unsigned char* const bytes = each.bytes;
         ASSERT_TRUE(image.setColorAsARGB(1, 1, bytes[0], bytes[1], bytes[2], bytes[3]));
@@ -84,28 +77,19 @@ TEST(Pixels, ArePackedWithTheLowBitsDropped) {
 
 TEST(Pixels, AreSetInsideTheImageOnly) {
     TestImage image(2, 2, FMT_RGB);
-    const std::string before(reinterpret_cast<const char*>(image.getData()), 12);
     for (const auto& at : {std::pair<int, int>{-1, 0}, {0, -1}, {2, 0}, {0, 2}})
-        EXPECT_FALSE(image.setColorAsARGB(at.first, at.second, 1, 2, 3, 4));
-    EXPECT_EQ(std::memcmp(image.getData(), before.data(), 12), 0);
+        EXPECT_FALSE(image.setColorAsARGB(at.first, at.second, 91, 92, 93, 94));
     EXPECT_TRUE(image.setColorAsARGB(0, 1, 91, 92, 93, 94));
-    EXPECT_EQ(image.getData()[8], 93);
-    EXPECT_EQ(image.getData()[9], 9) << "the neighbour's red";
+    EXPECT_EQ(std::memcmp(image.getData(), "\0\1\2\3\4\5\x5B\x5C\x5D\x9\xA\xB", 12), 0);
 }
 
-TEST(Images, FlipAroundTheMiddleRow) {
+TEST(Images, FlipAroundTheMiddleRowAndCheckTheirSizes) {
     TestImage image(1, 3, FMT_RGB);
     image.flipVertically();
     EXPECT_EQ(std::memcmp(image.getData(), "\6\7\10\3\4\5\0\1\2", 9), 0);
-}
-
-TEST(Images, KnowWhetherTheyArePowersOfTwo) {
     EXPECT_TRUE(Image_base(2, 256).dimensionsArePowerOfTwo());
     EXPECT_TRUE(Image_base(0, 0).dimensionsArePowerOfTwo());
     EXPECT_FALSE(Image_base(3, 4).dimensionsArePowerOfTwo());
-}
-
-TEST(Images, OfImpossibleSizeAreRefused) {
     EXPECT_THROW(Image_base(-1, 1), std::bad_alloc);
     EXPECT_THROW(Image_base(0x7FFFFFFF, 0x7FFFFFFF), std::bad_alloc);
 }
@@ -128,7 +112,7 @@ TEST(Images, BecomeTheSubstituteAndEmptyAgain) {
 
 TEST_F(GrayImage, GetsTheSameBytesAsPixelByPixel) {
     const int side = 32;
-    std::string file = pells_test::tgaHeader(side, side, 8);
+    std::string file = tgaHeader(side, side, 8);
     for (int i = 0; i < side * side; ++i)
         file += static_cast<char>(i);
     ASSERT_TRUE(load(file));
@@ -144,14 +128,14 @@ TEST_F(GrayImage, GetsTheSameBytesAsPixelByPixel) {
             unit[k] = static_cast<float>(c[k] * (1.0 / 255.0));
         }
         image.colorize(c[0], c[1], c[2], c[3], c[4], c[5]);
-        pells::RGBtoHSV(unit[0], unit[1], unit[2], unit[0], unit[1], unit[2]);
-        pells::RGBtoHSV(unit[3], unit[4], unit[5], unit[3], unit[4], unit[5]);
+        RGBtoHSV(unit[0], unit[1], unit[2], unit[0], unit[1], unit[2]);
+        RGBtoHSV(unit[3], unit[4], unit[5], unit[3], unit[4], unit[5]);
         for (int i = 0; i < side * side; ++i) {
             const float t = static_cast<float>(i & 0xFF) * (1.0F / 255.0F);
-            const pells::Color hsv =
-                pells::HSVInterpolate(unit[0], unit[1], unit[2], unit[3], unit[4], unit[5], t);
+            const Color hsv =
+                HSVInterpolate(unit[0], unit[1], unit[2], unit[3], unit[4], unit[5], t);
             float rgb[3];
-            pells::HSVtoRGB(hsv.r, hsv.g, hsv.b, rgb[0], rgb[1], rgb[2]);
+            HSVtoRGB(hsv.r, hsv.g, hsv.b, rgb[0], rgb[1], rgb[2]);
             for (int k = 0; k < 3; ++k)
                 ASSERT_EQ(image.getData()[i * 3 + k], static_cast<int>(rgb[k] * 255.0)) << i;
         }
@@ -184,7 +168,6 @@ TEST(HeaderNumbers, AreLittleEndian) {
     EXPECT_EQ(Image_base::getInt(bytes), 0xFFFE);
     Image_base::setCharValue(bytes, 0x1FF);
     EXPECT_EQ(Image_base::getCharValue(bytes), 255);
-    EXPECT_EQ(Image_base::getInt(bytes), 65535);
 }
 
 }  // namespace

@@ -1,35 +1,27 @@
 #include "pells/image/image_loaders.h"
 
-#include <gtest/gtest.h>
-
-#include <algorithm>
-#include <sstream>
-
 #include "pells/core/factory.h"
 #include "pells/image/image_base.h"
 #include "pells/image/image_fallback_manager.h"
-#include "pells/xml/tag.h"
 #include "support/archive_bytes.h"
+#include "support/documents.h"
 #include "support/test_prefs.h"
 #include "support/tga_file.h"
 
 namespace {
 
-using pells::Image_base;
-using pells::ImageFallbackManager;
-using pells_test::archiveOf;
-using pells_test::archiveWithDirectory;
-using pells_test::tgaFile;
+using namespace pells;
+using namespace pells_test;
 
 /// A loader of the application, which counts how many of them live.
-class CountedLoader : public pells::TGAFileLoader {
+class CountedLoader : public TGAFileLoader {
 public:
     CountedLoader() { ++alive; }
     ~CountedLoader() override { --alive; }
     static int alive;
 };
 int CountedLoader::alive = 0;
-const pells::SerializableFactory<CountedLoader> countedLoaderFactory("CountedLoader");
+const SerializableFactory<CountedLoader> countedLoaderFactory("CountedLoader");
 
 /// An image that loads TGA assets.
 class TgaImage : public Image_base {
@@ -37,22 +29,23 @@ public:
     explicit TgaImage(const std::string& name) : Image_base(name) { loadTarga(name); }
 };
 
-/// A stream that is cut off, and one that zlib refuses, under the name "tga".
-const std::string unreachable = archiveWithDirectory("Offff L10 |tga\r\n");
-const std::string damaged = archiveWithDirectory("O15 L4 |tga\r\n", "JUNK");
+/// A member whose stream is cut off, or one that zlib refuses.
+std::string cutArchive(const std::string& member) {
+    return archiveWithDirectory("Offff L10 |" + member + "\r\n");
+}
+std::string damagedArchive(const std::string& member) {
+    return archiveWithDirectory("O15 L4 |" + member + "\r\n", "JUNK");
+}
 
-class ImageLoading : public pells_test::LibraryTest {
+class ImageLoading : public LibraryTest {
 protected:
     ImageLoading() {
-        pells_test::prefs() = {{"log", "error"}, {"assetLocation", scratch.path()}};
+        prefs() = {{"log", "error"}, {"assetLocation", "."}};
         scratch.write("good.pell", archiveOf({{"tga", tgaFile(2, 2, 24)}}));
         scratch.write("good.tga", tgaFile(2, 2, 32));
     }
 
-    static bool logged(const std::string& line) {
-        const std::vector<std::string> lines = pells_test::logLines();
-        return std::find(lines.begin(), lines.end(), "error: " + line) != lines.end();
-    }
+    static bool logged(const std::string& line) { return !logLines("error: " + line).empty(); }
 
     Image_base image{1, 1};
 };
@@ -75,8 +68,8 @@ TEST_F(ImageLoading, ByNameReadsArchivesOnly) {
 
 TEST_F(ImageLoading, ByDerivedClassesGivesThePictureOrTheSubstitute) {
     scratch.write("cut.tga", tgaFile(2, 2, 32).substr(0, 20));
-    scratch.write("unreachable.asset", archiveWithDirectory("Offff L10 |far.tga\r\n"));
-    scratch.write("damaged.asset", archiveWithDirectory("O15 L4 |bad.tga\r\n", "JUNK"));
+    scratch.write("unreachable.asset", cutArchive("far.tga"));
+    scratch.write("damaged.asset", damagedArchive("bad.tga"));
     EXPECT_FALSE(TgaImage("good.tga").isBogusImage());
     for (const char* const name : {"cut.tga", "far.tga", "bad.tga", "missing.tga", ""}) {
         TgaImage substitute(name);
@@ -88,43 +81,35 @@ TEST_F(ImageLoading, ByDerivedClassesGivesThePictureOrTheSubstitute) {
         "Image(far.tga): Can't read image: Can't read pell data stream for member 'far.tga'"));
 }
 
-struct BadArchive {
-    std::string bytes;  // "" for no file
-    std::string line;
-};
-
 TEST_F(ImageLoading, FromArchivesSaysWhyItFailed) {
     const std::string prefix = "Image(bad.pell): Can't read pell file: ";
-    const BadArchive archives[] = {
+    const std::pair<std::string, std::string> archives[] = {
         {"", prefix + "Can't open pell file"},
-        {unreachable, prefix + "Can't read pell data stream for member 'tga'"},
-        {damaged, prefix + "std::exception error was thrown!!ZlibInflater::read(): bad pell data "
-                           "stream for member 'tga': Z_DATA_ERROR (-3): incorrect header check"},
+        {cutArchive("tga"), prefix + "Can't read pell data stream for member 'tga'"},
+        {damagedArchive("tga"),
+         prefix + "std::exception error was thrown!!ZlibInflater::read(): bad pell data "
+                  "stream for member 'tga': Z_DATA_ERROR (-3): incorrect header check"},
         {archiveOf({{"picture", "x"}}), "tga file shorter than header (0 bytes)"},
     };
-    pells::PellTGAFileLoader loader("bad.pell");
-    for (const BadArchive& each : archives) {
-        if (!each.bytes.empty())
-            scratch.write("bad.pell", each.bytes);
-        EXPECT_FALSE(loader.uploadImage(&image)) << each.line;
-        EXPECT_TRUE(logged(each.line)) << each.line;
+    PellTGAFileLoader loader("bad.pell");
+    for (const auto& each : archives) {
+        if (!each.first.empty())
+            scratch.write("bad.pell", each.first);
+        EXPECT_FALSE(loader.uploadImage(&image)) << each.second;
+        EXPECT_TRUE(logged(each.second)) << each.second;
     }
 }
 
 TEST_F(ImageLoading, NeedsANameAndAnImage) {
-    EXPECT_FALSE(pells::TGAFileLoader().uploadImage(&image));
-    EXPECT_FALSE(pells::PellTGAFileLoader(nullptr).uploadImage(&image));
-    EXPECT_FALSE(pells::FileLoader("good.tga").uploadImage(&image));
+    EXPECT_FALSE(TGAFileLoader().uploadImage(&image));
+    EXPECT_FALSE(PellTGAFileLoader(nullptr).uploadImage(&image));
+    EXPECT_FALSE(FileLoader("good.tga").uploadImage(&image));
     EXPECT_TRUE(image.isValid()) << "nothing touched it";
-    EXPECT_FALSE(pells::TGAFileLoader("good.tga").uploadImage(nullptr));
-
-    pells::PellTGAFileLoader loader("d.pell");
+    EXPECT_FALSE(TGAFileLoader("good.tga").uploadImage(nullptr));
+    PellTGAFileLoader loader("d.pell");
     loader.appendPathInfo("goo");
     EXPECT_TRUE(loader.uploadImage(&image));
-    std::ostringstream out;
-    pells::OutTag tag(out, "getter");
-    loader.save(tag);
-    EXPECT_EQ(out.str(), "<getter>\n    <text>good.pell</text>\n</getter>\n");
+    EXPECT_EQ(compact(saved(loader)), "<root><text>good.pell</text></root>");
 }
 
 std::string getter(const std::string& loader, const std::string& file) {
@@ -165,46 +150,40 @@ TEST_F(ImageLoading, ThroughTheManagerTriesTheLoadersInOrder) {
         EXPECT_EQ(manager.setupNewImage(&image, name), ImageFallbackManager::NO_SUCH_NAME) << name;
 
     EXPECT_EQ(CountedLoader::alive, 3) << "the replaced entry's loader is kept, too";
-    pells::SingletonList::freeSingletons();
+    SingletonList::freeSingletons();
     EXPECT_EQ(CountedLoader::alive, 0);
 }
-
-struct BadDefinitions {
-    std::string document;  // "" for no file
-    std::string line;
-    bool throws;
-};
 
 TEST_F(ImageLoading, DefinitionsThatCannotBeReadLeaveNothingBehind) {
     const std::string good = entry("wall", getter("CountedLoader", "good.tga"));
     const std::string constructor = "ImageFallbackManager:Constructor for ImageFallbackManager ";
     const std::string format =
         constructor + "opened an XML file that did not have the correct 'imagedefs' format.";
-    const BadDefinitions documents[] = {
-        {"", constructor + "could not find the XML file 'images.xml'.", false},
-        {"<images>" + good + "</images>", format, false},
-        {"imagedefs", format, false},
-        {"</imagedefs>", format, false},
-        {"<imagedefs/>", "LoadFail: Malformed XML: premature EOF", true},
-        {definitions(good).substr(0, 120), "LoadFail: Malformed XML: premature EOF", true},
+    const std::pair<std::string, std::string> documents[] = {
+        {"", constructor + "could not find the XML file 'images.xml'."},
+        {"<images>" + good + "</images>", format},
+        {"imagedefs", format},
+        {"</imagedefs>", format},
+        {"<imagedefs/>", "LoadFail: Malformed XML: premature EOF"},
+        {definitions(good).substr(0, 120), "LoadFail: Malformed XML: premature EOF"},
         {definitions(good + entry("x", getter("CountedLoader", "") + "</text>")),
-         "LoadFail: Malformed XML: bad close tag", true},
+         "LoadFail: Malformed XML: bad close tag"},
         {definitions(good + entry("x", getter("NoLoader", ""))),
-         "LoadFail: Bad class='NoLoader' in element <getter>", true},
+         "LoadFail: Bad class='NoLoader' in element <getter>"},
     };
-    for (const BadDefinitions& each : documents) {
-        SCOPED_TRACE(each.document);
-        if (!each.document.empty())
-            scratch.write("Data/images.xml", each.document);
-        if (each.throws) {
-            EXPECT_THROW(ImageFallbackManager::instance(), pells::Serializable::LoadFail);
+    for (const auto& each : documents) {
+        SCOPED_TRACE(each.first);
+        if (!each.first.empty())
+            scratch.write("Data/images.xml", each.first);
+        if (each.second.find("LoadFail") == 0) {
+            EXPECT_THROW(ImageFallbackManager::instance(), Serializable::LoadFail);
             EXPECT_FALSE(ImageFallbackManager::singleton);
         } else {
             EXPECT_EQ(ImageFallbackManager::instance().setupNewImage(&image, "wall"), 3);
         }
         EXPECT_EQ(CountedLoader::alive, 0);
-        EXPECT_TRUE(logged(each.line));
-        pells::SingletonList::freeSingletons();
+        EXPECT_TRUE(logged(each.second));
+        SingletonList::freeSingletons();
     }
 }
 

@@ -1,33 +1,14 @@
 #include "pells/material/material.h"
 
-#include <gtest/gtest.h>
-
-#include <sstream>
-
-#include "pells/xml/tag.h"
+#include "support/documents.h"
 #include "support/test_prefs.h"
+
+using namespace pells;
+using namespace pells_test;
 
 namespace {
 
-using pells::Color;
-using pells::Material;
-
-class MaterialTest : public pells_test::LibraryTest {};
-
-std::string saved(Material& material, int precision = 6) {
-    std::ostringstream out;
-    out.precision(precision);
-    pells::OutTag root(out, "material");
-    material.save(root);
-    return out.str();
-}
-
-void load(Material& material, const std::string& document) {
-    std::istringstream in(document);
-    pells::XMLTokenizer tokenizer(in);
-    pells::OpenTag root(tokenizer, tokenizer.getToken());
-    material.load(root, nullptr);
-}
+class MaterialTest : public LibraryTest {};
 
 void expectColor(const Color& actual, const Color& expected) {
     EXPECT_FLOAT_EQ(actual.r, expected.r);
@@ -36,24 +17,15 @@ void expectColor(const Color& actual, const Color& expected) {
     EXPECT_FLOAT_EQ(actual.a, expected.a);
 }
 
-TEST_F(MaterialTest, IsSavedInTheOrderOfItsMembers) {
-    Material material;
-    EXPECT_EQ(saved(material),
-              "<material>\n"
-              "    <ambient a=\"1\" b=\"0.2\" g=\"0.2\" r=\"0.2\"/>\n"
-              "    <diffuse a=\"1\" b=\"0.8\" g=\"0.8\" r=\"0.8\"/>\n"
-              "    <specular a=\"1\" b=\"0\" g=\"0\" r=\"0\"/>\n"
-              "    <emissive a=\"1\" b=\"0\" g=\"0\" r=\"0\"/>\n"
-              "    <shininess>100</shininess>\n"
-              "    <ambdiff>0</ambdiff>\n"
-              "    <texname></texname>\n"
-              "    <texscale>1</texscale>\n"
-              "    <texangle>0</texangle>\n"
-              "</material>\n");
-}
-
 TEST_F(MaterialTest, ComesBackAsItWasSaved) {
     Material material;
+    EXPECT_EQ(compact(saved(material)),
+              "<root><ambient a=\"1\" b=\"0.2\" g=\"0.2\" r=\"0.2\"/>"
+              "<diffuse a=\"1\" b=\"0.8\" g=\"0.8\" r=\"0.8\"/>"
+              "<specular a=\"1\" b=\"0\" g=\"0\" r=\"0\"/>"
+              "<emissive a=\"1\" b=\"0\" g=\"0\" r=\"0\"/><shininess>100</shininess>"
+              "<ambdiff>0</ambdiff><texname></texname><texscale>1</texscale>"
+              "<texangle>0</texangle></root>");
     material.setAmbientAndDiffuse(0.125f, 0.25f, 0.5f, 1);
     material.setSpecular(1, 0.5f, 0.25f, 0.75f);
     material.setEmissive(Color{0, 0.0625f, 0, 0});
@@ -72,8 +44,7 @@ TEST_F(MaterialTest, ComesBackAsItWasSaved) {
     EXPECT_FALSE(copy.ambientAndDiffuse());
     EXPECT_FALSE(copy.hasTexture());
     expectColor(copy.ambient(), Color{0.75f, 0.25f, 0.5f, 1});
-    expectColor(copy.diffuse(), Color{0.125f, 0.25f, 0.5f, 1});
-    EXPECT_THROW(load(copy, "<m><diffuse r='0.5cm'/></m>"), pells::Serializable::LoadFail);
+    EXPECT_NE(failure(copy, "<m><diffuse r='0.5cm'/></m>"), "");
     expectColor(copy.diffuse(), Color{0.125f, 0.25f, 0.5f, 1});
 }
 
@@ -90,7 +61,7 @@ TEST_F(MaterialTest, KnowsWhetherAmbientAndDiffuseWereSetTogether) {
     expectColor(material.diffuse(), Color{0, 0, 1, 1});
 }
 
-TEST_F(MaterialTest, BlendsColoursHalfwayInHue) {
+TEST_F(MaterialTest, BlendsHalfwayInHueAndKeepsItsTexture) {
     const struct {
         Color a, b, blend;
     } cases[] = {{{1, 0, 0, 1}, {0, 1, 0, 1}, {1, 1, 0, 1}},
@@ -102,29 +73,23 @@ TEST_F(MaterialTest, BlendsColoursHalfwayInHue) {
     for (const auto& each : cases) {
         Material first;
         Material second;
+        first.setAmbientAndDiffuse(each.a);
         first.setSpecular(each.a);
+        first.setTextureData("mine", 2, 3);
         second.setSpecular(each.b);
+        second.setShininess(50);
+        second.setTextureData("other", 4, 5);
+        Material both = first;
+        both.blendWith(first);
+        EXPECT_TRUE(both.ambientAndDiffuse());
         first.blendWith(second);
         expectColor(first.specular(), each.blend);
+        EXPECT_FALSE(first.ambientAndDiffuse());
+        EXPECT_EQ(first.shininess(), 75);
+        EXPECT_EQ(first.textureName(), "mine");
+        EXPECT_EQ(first.textureScale(), 2);
+        EXPECT_EQ(first.textureAngle(), 3);
     }
-}
-
-TEST_F(MaterialTest, BlendsTheRestAndKeepsItsTexture) {
-    Material first;
-    Material second;
-    first.setAmbientAndDiffuse(1, 0, 0, 1);
-    first.setTextureData("mine", 2, 3);
-    second.setShininess(50);
-    second.setTextureData("other", 4, 5);
-    Material both = first;
-    both.blendWith(first);
-    EXPECT_TRUE(both.ambientAndDiffuse());
-    first.blendWith(second);
-    EXPECT_FALSE(first.ambientAndDiffuse());
-    EXPECT_EQ(first.shininess(), 75);
-    EXPECT_EQ(first.textureName(), "mine");
-    EXPECT_EQ(first.textureScale(), 2);
-    EXPECT_EQ(first.textureAngle(), 3);
 }
 
 }  // namespace

@@ -10,6 +10,7 @@
 #include "pells/serial/serializable.h"
 #include "support/allocations.h"
 #include "support/archive_bytes.h"
+#include "support/chunked_buffer.h"
 #include "support/everything.h"
 #include "support/test_prefs.h"
 #include "support/tga_file.h"
@@ -99,10 +100,15 @@ protected:
 TEST_F(Proportion, OfAPictureThatIsClaimedButNotThere) {
     pells::Image_base image(1, 1);
     for (const int depth : {8, 24, 32}) {
-        std::istringstream in(pells_test::tgaHeader(65535, 65535, depth));
-        const AllocationMeter meter;
-        EXPECT_FALSE(pells::TGAFileLoader::loadTarga(&image, in));
-        EXPECT_LT(meter.peakBytes(), MiB);
+        for (const std::size_t delivered : {0u, 100000u, 1000000u}) {
+            const std::string file =
+                pells_test::tgaHeader(65535, 65535, depth) + std::string(delivered, 'x');
+            pells_test::ChunkedBuffer withoutEnd(file, 1000);
+            std::istream in(&withoutEnd);
+            const AllocationMeter meter;
+            EXPECT_FALSE(pells::TGAFileLoader::loadTarga(&image, in));
+            EXPECT_LT(meter.peakBytes(), 5 * std::int64_t(delivered) + 64 * KiB);
+        }
     }
 }
 

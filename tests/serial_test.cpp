@@ -1,5 +1,3 @@
-#include <gtest/gtest.h>
-
 #include <cmath>
 #include <cstring>
 #include <iomanip>
@@ -12,51 +10,15 @@
 #include "pells/log/log.h"
 #include "pells/serial/enum.h"
 #include "pells/serial/member_field.h"
+#include "support/documents.h"
 #include "support/test_prefs.h"
+
+using namespace pells;
+using namespace pells_test;
 
 namespace {
 
 using boost::intrusive_ptr;
-using pells::ClassDesc;
-using pells::Color;
-using pells::Field;
-using pells::makeComposite;
-using pells::makeField;
-using pells::OpenTag;
-using pells::OutTag;
-using pells::Serializable;
-using pells::SingleTag;
-using pells::XMLTokenizer;
-
-std::string saved(Serializable& object, const std::string& name = "root") {
-    std::ostringstream out;
-    OutTag tag(out, name);
-    object.save(tag);
-    return out.str();
-}
-
-void load(Serializable& object, const std::string& document) {
-    std::istringstream in(document);
-    XMLTokenizer tokenizer(in);
-    const XMLTokenizer::Token token = tokenizer.getToken();
-    if (token.type == XMLTokenizer::Token::T_SINGLE) {
-        SingleTag root(tokenizer, token);
-        object.load(root, nullptr);
-    } else {
-        OpenTag root(tokenizer, token);
-        object.load(root, nullptr);
-    }
-}
-
-/// "" or the message of the LoadFail.
-std::string failure(Serializable& object, const std::string& document) {
-    try {
-        load(object, document);
-    } catch (const Serializable::LoadFail& fail) {
-        return fail.what();
-    }
-    return "";
-}
 
 /// Members of every type that is written as text or attributes.
 struct Values : Serializable {
@@ -79,101 +41,67 @@ struct Values : Serializable {
     }
 };
 
-const char freshValues[] =
-    "<root>\n    <x>7</x>\n    <d>7</d>\n    <b>1</b>\n    <i>7</i>\n    <u>7</u>\n    <l>7</l>\n"
-    "    <s>old</s>\n    <c a=\"1\" b=\"0.25\" g=\"0.5\" r=\"1\"/>\n</root>\n";
-
-/// The document of fresh values after one line was replaced.
-std::string freshBut(const std::string& oldLine, const std::string& newLine) {
-    std::string document = freshValues;
-    return document.replace(document.find(oldLine), oldLine.size(), newLine);
+/// The saved lines that differ from those of fresh values.
+std::string changes(Values& values) {
+    Values fresh;
+    std::istringstream before(saved(fresh));
+    std::istringstream after(saved(values));
+    std::string found;
+    for (std::string was, is; std::getline(before, was) && std::getline(after, is);)
+        found += was == is ? "" : is.substr(4);
+    return found;
 }
 
-struct Case {
-    const char* content;
-    const char* oldLine;
-    const char* newLine;
-};
+class SerialTest : public LibraryTest {};
 
-TEST(Values, AreReadFromTextAndAttributes) {
-    const Case cases[] = {
-        {"", "<x>7<", "<x>7<"},
-        {"<x>  2.5  </x>", "<x>7<", "<x>2.5<"},
-        {"<x>1</x><x>2</x>", "<x>7<", "<x>2<"},
-        {"<x>1<y/>2<!-- -->5</x>", "<x>7<", "<x>25<"},
-        {"<x>abc</x>", "<x>7<", "<x>7<"},
-        {"<x></x>", "<x>7<", "<x>7<"},
-        {"<x/>", "<x>7<", "<x>7<"},
-        {"<x>1e999</x>", "<x>7<", "<x>7<"},
-        {"<x>1e</x>", "<x>7<", "<x>7<"},
-        {"<x>inf</x>", "<x>7<", "<x>7<"},
-        {"<x>-nan</x>", "<x>7<", "<x>7<"},
-        {"<x>+.5e+1</x>", "<x>7<", "<x>5<"},
-        {"<x>-1.</x>", "<x>7<", "<x>-1<"},
-        {"<x>0.333333343</x>", "<x>7<", "<x>0.333333<"},
-        {"<x>16777217e0</x>", "<x>7<", "<x>1.67772e+07<"},
-        {"<d>1e300</d>", "<d>7<", "<d>1e+300<"},
-        {"<b>0</b>", "<b>1<", "<b>0<"},
-        {"<b> 00\n</b>", "<b>1<", "<b>0<"},
-        {"<b>true</b><b>false</b><b>2</b>", "<b>1<", "<b>1<"},
-        {"<i> -12 </i>", "<i>7<", "<i>-12<"},
-        {"<i>+12</i>", "<i>7<", "<i>12<"},
-        {"<i>2147483648</i>", "<i>7<", "<i>7<"},
-        {"<u>4294967295</u>", "<u>7<", "<u>4294967295<"},
-        {"<u>-1</u>", "<u>7<", "<u>7<"},
-        {"<l>-9223372036854775808</l>", "<l>7<", "<l>-9223372036854775808<"},
-        {"<s>  a &lt; b  </s>", "<s>old<", "<s>a &lt; b  <"},
-        {"<s/>", "<s>old<", "<s><"},
-        {"<s></s>", "<s>old<", "<s>old<"},
-        {"<s>one<b/>two</s>", "<s>old<", "<s>two<"},
-        {"<s class='x'>new</s>", "<s>old<", "<s>new<"},
-        {"<c r=' 0.5 ' g='x' b='' extra='1'/>", "g=\"0.5\" r=\"1\"", "g=\"0.5\" r=\"0.5\""},
-        {"<c r='0.123456789'>1<deep><deeper/></deep></c>", "r=\"1\"", "r=\"0.123457\""},
-        {"ignored<super><x>1</x></super>", "<x>7<", "<x>7<"},
-    };
-    for (const Case& each : cases) {
-        Values values;
-        load(values, "<root x='1'>" + std::string(each.content) + "</root>");
-        EXPECT_EQ(saved(values), freshBut(each.oldLine, each.newLine)) << each.content;
-    }
-    Values values;
-    load(values, "<root/>");
-    EXPECT_EQ(saved(values), freshValues);
-}
-
-class SerialTest : public pells_test::LibraryTest {};
-
-TEST_F(SerialTest, NamesWhatIsWrongAndKeepsWhatWasRead) {
+TEST_F(SerialTest, ReadsValuesFromTextAndAttributesAndNamesWhatIsWrong) {
     const char scan[] = "Failed to scan text value";
     const char close[] = "Malformed XML: bad close tag";
     const char end[] = "Malformed XML: premature EOF";
-    struct {
+    const struct {
         const char* content;
+        const char* change;
         const char* message;
-        const char* oldLine;
-        const char* newLine;
-    } const cases[] = {
-        {"<x>2.5cm</x></root>", scan, "<x>7<", "<x>2.5<"},
-        {"<x>1.2.3</x></root>", scan, "<x>7<", "<x>1.2<"},
-        {"<x>0x10</x></root>", scan, "<x>7<", "<x>0<"},
-        {"<x>1,5</x></root>", scan, "<x>7<", "<x>1<"},
-        {"<i>1.5</i></root>", scan, "<i>7<", "<i>1<"},
-        {"<b>0 1</b></root>", scan, "<b>1<", "<b>0<"},
-        {"<c r='0.5' g='1.0.0'/></root>", scan, "", ""},
-        {"<s>new</s", end, "<s>old<", "<s>new<"},
-        {"<s>new", end, "<s>old<", "<s>new<"},
-        {"<s>new</root>", close, "<s>old<", "<s>new<"},
-        {"</rot>", close, "", ""},
-        {"<none><x></none></x></root>", close, "", ""},
-        {"<none><x>", end, "", ""},
-        {"<!DOCTYPE x></root>", end, "", ""},
+    } cases[] = {
+        {"ignored<super><x>1</x></super><x></x><x/><i/><x>abc</x><s></s>", "", ""},
+        {"<x>1e999</x><x>1e</x><x>inf</x><x>-nan</x><b>true</b><b>false</b><b>2</b>", "", ""},
+        {"<i>2147483648</i><u>-1</u><u>4294967296</u><l>9223372036854775808</l>", "", ""},
+        {"<x>1</x><x>  2.5\t\n\v\f\r </x><i> -12 </i><s/>", "<x>2.5</x><i>-12</i><s></s>", ""},
+        {"<x>1<y/>2<!-- -->5</x><b> 00\n</b><i>+12</i>", "<x>25</x><b>0</b><i>12</i>", ""},
+        {"<x>+.5e+1</x><d>-1.</d>", "<x>5</x><d>-1</d>", ""},
+        {"<x>0.333333343</x><d>1e300</d>", "<x>0.333333</x><d>1e+300</d>", ""},
+        {"<x>16777217e0</x><u>4294967295</u><l>-9223372036854775808</l>",
+         "<x>1.67772e+07</x><u>4294967295</u><l>-9223372036854775808</l>", ""},
+        {"<s>  a &lt; b  </s>", "<s>a &lt; b  </s>", ""},
+        {"<s class='x'>one<b/>two</s>", "<s>two</s>", ""},
+        {"<c r=' 0.5 ' g='x' b='' extra='1' a='0.123456789'>1<x><y/></x></c>",
+         "<c a=\"0.123457\" b=\"0.25\" g=\"0.5\" r=\"0.5\"/>", ""},
+        {"<x>2.5\xA0</x>", "<x>2.5</x>", scan},
+        {"<x>2.5cm</x>", "<x>2.5</x>", scan},
+        {"<x>1.2.3</x>", "<x>1.2</x>", scan},
+        {"<x>0x10</x>", "<x>0</x>", scan},
+        {"<x>1,5</x>", "<x>1</x>", scan},
+        {"<i>1.5</i>", "<i>1</i>", scan},
+        {"<b>0 1</b>", "<b>0</b>", scan},
+        {"<c r='0.5' g='1.0.0'/>", "", scan},
+        {"<s>new</s", "<s>new</s>", end},
+        {"<s>new&", "<s>new</s>", end},
+        {"<s>new", "<s>new</s>", close},
+        {"</rot>", "", close},
+        {"<none><x></none></x>", "", close},
+        {"<none><x>&", "", end},
+        {"<!DOCTYPE x>", "", end},
     };
     for (const auto& each : cases) {
         Values values;
-        EXPECT_EQ(failure(values, "<root>" + std::string(each.content)), each.message)
+        EXPECT_EQ(failure(values, "<root x='1'>" + std::string(each.content) + "</root>"),
+                  each.message)
             << each.content;
-        EXPECT_EQ(saved(values), freshBut(each.oldLine, each.newLine)) << each.content;
+        EXPECT_EQ(changes(values), each.change) << each.content;
     }
+    Values values;
+    load(values, "<root/>");
+    EXPECT_EQ(changes(values), "");
 }
 
 struct Base : Serializable {
@@ -195,63 +123,50 @@ struct Derived : Base {
     }
 };
 
-const char sevenLines[] =
-    "<root>\n"
-    "    <super>\n"
-    "        <y>1</y>\n"
-    "    </super>\n"
-    "    <x>0.5</x>\n"
-    "    <s>hi</s>\n"
-    "</root>\n";
-
 TEST_F(SerialTest, SavesTheBaseFirstAndLoadsInAnyOrder) {
     Derived object;
-    EXPECT_EQ(saved(object), sevenLines);
-
+    EXPECT_EQ(saved(object),
+              "<root>\n    <super>\n        <y>1</y>\n    </super>\n    <x>0.5</x>\n"
+              "    <s>hi</s>\n</root>\n");
+    EXPECT_EQ(logLines().at(0), "mac: FieldPtr less being called.");
     load(object, "<root><s>a&amp;b</s><x>2</x><super><y>0</y></super></root>");
-    EXPECT_EQ(object.s, "a&b");
-    EXPECT_EQ(object.x, 2);
-    EXPECT_FALSE(object.y);
-    load(object, sevenLines);
-    EXPECT_EQ(saved(object), sevenLines);
+    EXPECT_EQ(compact(saved(object)), "<root><super><y>0</y></super><x>2</x><s>a&amp;b</s></root>");
 }
 
 TEST_F(SerialTest, LogsEveryTokenAndWhatItDoesNotKnow) {
-    pells_test::prefs() = {{"log", "load error"}};
+    prefs() = {{"log", "load error"}};
     Derived object;
     load(object, "<root><one a='1'><two/></one><x>1</x><one/></root>");
     EXPECT_EQ(
-        pells_test::logLines(),
-        (std::vector<std::string>{
-            "load: Processing Token: 2 (T_OPEN) <one a=\"1\">", "load.warn: Unrecognized tag <one>",
-            "load.warn:     valid ones are:", "load.warn:     <s>", "load.warn:     <super>",
-            "load.warn:     <x>", "load: Processing Token: 1 (T_SINGLE) <two/>",
-            "load.warn: Unrecognized tag <two/>", "load.warn:     valid ones are:",
-            "load: Processing Token: 3 (T_CLOSE) </one>", "load: Processing Token: 2 (T_OPEN) <x>",
-            "load: Processing Token: 4 (T_TEXT) \"1\"", "load: Processing Token: 3 (T_CLOSE) </x>",
-            "load: Processing Token: 1 (T_SINGLE) <one/>", "load.warn: Unrecognized tag <one/>",
-            "load: Processing Token: 3 (T_CLOSE) </root>"}));
+        logLines(),
+        (Lines{"load: Processing Token: 2 (T_OPEN) <one a=\"1\">",
+               "load.warn: Unrecognized tag <one>", "load.warn:     valid ones are:",
+               "load.warn:     <s>", "load.warn:     <super>", "load.warn:     <x>",
+               "load: Processing Token: 1 (T_SINGLE) <two/>", "load.warn: Unrecognized tag <two/>",
+               "load.warn:     valid ones are:", "load: Processing Token: 3 (T_CLOSE) </one>",
+               "load: Processing Token: 2 (T_OPEN) <x>", "load: Processing Token: 4 (T_TEXT) \"1\"",
+               "load: Processing Token: 3 (T_CLOSE) </x>",
+               "load: Processing Token: 1 (T_SINGLE) <one/>", "load.warn: Unrecognized tag <one/>",
+               "load: Processing Token: 3 (T_CLOSE) </root>"}));
 }
 
 /// An unrecognised element at any depth warns of its own names once, as the ones around it do.
 TEST_F(SerialTest, WarnsOncePerElementAtEveryDepth) {
-    pells_test::prefs() = {{"log", "load.warn log.dumptags"}};
+    prefs() = {{"log", "load.warn log.dumptags"}};
     Derived object;
     load(object, "<root><x><a><b/><c><d/><e>t</e></c><f/></a><g/></x><h/></root>");
-    pells::Log::instance().dumpTags();
-    const std::string line = "load.warn: Unrecognized tag ";
-    const std::string list = "load.warn:     valid ones are:";
-    EXPECT_EQ(
-        pells_test::logLines(),
-        (std::vector<std::string>{
-            line + "<a>", list, "load.warn:     <>", line + "<b/>", list, line + "<c>",
-            line + "<d/>", list, line + "<e>", line + "<f/>", line + "<g/>", line + "<h/>", list,
-            "load.warn:     <s>", "load.warn:     <super>", "load.warn:     <x>",
-            "log.dumptags: available log message tags:",
-            // Each place that logs asks for its tag once, and each probe asks for its own.
-            "log.dumptags: off   1  load", "log.dumptags: on    3  load.warn",
-            "log.dumptags: on    1  log.dumptags", "log.dumptags: off   1  log.flush",
-            "log.dumptags: off  15  time.detail.parser", "log.dumptags: -- end of log tags --"}));
+    Log::instance().dumpTags();
+    const std::string line = "Unrecognized tag ";
+    const std::string list = "    valid ones are:";
+    EXPECT_EQ(logLines("load.warn: "),
+              (Lines{line + "<a>", list, "    <>", line + "<b/>", list, line + "<c>", line + "<d/>",
+                     list, line + "<e>", line + "<f/>", line + "<g/>", line + "<h/>", list,
+                     "    <s>", "    <super>", "    <x>"}));
+    // Each place that logs asks for its tag once, and each probe asks for its own.
+    EXPECT_EQ(logLines("log.dumptags: "),
+              (Lines{"available log message tags:", "off   1  load", "on    3  load.warn",
+                     "on    1  log.dumptags", "off   1  log.flush", "off  15  time.detail.parser",
+                     "-- end of log tags --"}));
 }
 
 struct Undescribed : Serializable {};
@@ -261,39 +176,27 @@ TEST_F(SerialTest, LogsItsErrors) {
     EXPECT_THROW(saved(mute), Serializable::LoadFail);
     EXPECT_EQ(failure(mute, "<root/>"), "No load() method");
     Values values;
-    failure(values, "<root><x>1</root>");
-    failure(values, "<root><none><deep></none></root>");
-    failure(values, "<root><x>1</x>");
-    failure(values, "<root><none><deep>");
+    for (const char* bad : {"<root><x>1</root>", "<root><none><deep></none></root>",
+                            "<root><x>1</x>", "<root><none><deep>"})
+        failure(values, bad);
     const std::vector<Serializable::SaveFail> copies(2, Serializable::SaveFail("full"));
     EXPECT_STREQ(copies[1].what(), "full");
-    std::vector<std::string> errors;
-    for (const std::string& line : pells_test::logLines()) {
-        if (line.compare(0, 7, "error: ") == 0)
-            errors.push_back(line.substr(7));
-    }
-    const std::string where = " must override either Serializable::";
+    const std::string where =
+        "(anonymous namespace)::Undescribed must override either Serializable::";
     EXPECT_EQ(
-        errors,
-        (std::vector<std::string>{
-            "(anonymous namespace)::Undescribed" + where + "save() or Serializable::getField()!",
-            "LoadFail: No save() method",
-            "(anonymous namespace)::Undescribed" + where + "load() or Serializable::getField()!",
-            "LoadFail: No load() method",
-            "Malformed XML: <x> paired with </root>",
-            "LoadFail: Malformed XML: bad close tag",
-            "Malformed XML: <deep> paired with </none>",
-            "LoadFail: Malformed XML: bad close tag",
-            "Malformed XML! Reached EOF without seeing close </root>",
-            "LoadFail: Malformed XML: premature EOF",
-            "Malformed XML! Reached EOF without seeing close </deep>",
-            "LoadFail: Malformed XML: premature EOF",
-            "SaveFail: full",
-        }));
+        logLines("error: "),
+        (Lines{where + "save() or Serializable::getField()!", "LoadFail: No save() method",
+               where + "load() or Serializable::getField()!", "LoadFail: No load() method",
+               "Malformed XML: <x> paired with </root>", "LoadFail: Malformed XML: bad close tag",
+               "Malformed XML: <deep> paired with </none>",
+               "LoadFail: Malformed XML: bad close tag",
+               "Malformed XML! Reached EOF without seeing close </root>",
+               "LoadFail: Malformed XML: premature EOF",
+               "Malformed XML! Reached EOF without seeing close </deep>",
+               "LoadFail: Malformed XML: premature EOF", "SaveFail: full"}));
 }
 
-class Shape : public Serializable {
-public:
+struct Shape : Serializable {
     static std::set<Shape*> alive;
     std::string title;
 
@@ -309,17 +212,16 @@ std::set<Shape*> Shape::alive;
 class Circle : public Shape {};
 class Square : public Shape {};
 
-class Step : public Serializable, public pells::smart_base {
-public:
+struct Step : Serializable, smart_base {
     int number = 0;
     intrusive_ptr<Field> getField(const std::string& name) override {
         return makeComposite(name, ClassDesc(makeField("number", &Step::number)));
     }
 };
 
-const pells::SerializableFactory<Circle> circleFactory("Circle");
-const pells::SerializableFactory<Step> stepFactory("Step");
-const pells::SerializableFactory<Values> valuesFactory("Values");
+const SerializableFactory<Circle> circleFactory("Circle");
+const SerializableFactory<Step> stepFactory("Step");
+const SerializableFactory<Values> valuesFactory("Values");
 
 struct Drawing : Serializable {
     Shape* shape = nullptr;
@@ -351,63 +253,23 @@ struct Drawing : Serializable {
     }
 };
 
-const char fullDrawing[] =
-    "<root>\n"
-    "    <shape class=\"Circle\">\n"
-    "        <title>big</title>\n"
-    "    </shape>\n"
-    "    <step class=\"Step\">\n"
-    "        <number>3</number>\n"
-    "    </step>\n"
-    "    <shapes>\n"
-    "        <shape class=\"Circle\">\n"
-    "            <title>small</title>\n"
-    "        </shape>\n"
-    "    </shapes>\n"
-    "    <stack>\n"
-    "        <stackItem class=\"Step\">\n"
-    "            <number>4</number>\n"
-    "        </stackItem>\n"
-    "    </stack>\n"
-    "    <nested>\n"
-    "        <super>\n"
-    "            <y>0</y>\n"
-    "        </super>\n"
-    "        <x>2</x>\n"
-    "        <s>in</s>\n"
-    "    </nested>\n"
-    "    <entries>\n"
-    "        <entry>\n"
-    "            <super>\n"
-    "                <y>1</y>\n"
-    "            </super>\n"
-    "            <x>0.5</x>\n"
-    "            <s>hi</s>\n"
-    "        </entry>\n"
-    "    </entries>\n"
-    "    <sizes>\n"
-    "        <size>0.5</size>\n"
-    "        <size>-3</size>\n"
-    "    </sizes>\n"
-    "    <names>\n"
-    "        <name>a</name>\n"
-    "    </names>\n"
-    "    <rows>\n"
-    "        <row>\n"
-    "            <rowItem>1</rowItem>\n"
-    "            <rowItem>2</rowItem>\n"
-    "        </row>\n"
-    "        <row/>\n"
-    "    </rows>\n"
-    "</root>\n";
+const std::string fullDrawing =
+    "<root><shape class=\"Circle\"><title>big</title></shape>"
+    "<step class=\"Step\"><number>3</number></step>"
+    "<shapes><shape class=\"Circle\"><title>small</title></shape></shapes>"
+    "<stack><stackItem class=\"Step\"><number>4</number></stackItem></stack>"
+    "<nested><super><y>0</y></super><x>2</x><s>in</s></nested>"
+    "<entries><entry><super><y>1</y></super><x>0.5</x><s>hi</s></entry></entries>"
+    "<sizes><size>0.5</size><size>-3</size></sizes><names><name>a</name></names>"
+    "<rows><row><rowItem>1</rowItem><rowItem>2</rowItem></row><row/></rows></root>";
 
 TEST_F(SerialTest, RoundTripsObjectsPointersAndSequences) {
     Drawing drawing;
     load(drawing, fullDrawing);
-    EXPECT_EQ(saved(drawing), fullDrawing);
+    EXPECT_EQ(compact(saved(drawing)), fullDrawing);
 
     drawing.shapes.push_back(nullptr);
-    EXPECT_EQ(saved(drawing), fullDrawing);
+    EXPECT_EQ(compact(saved(drawing)), fullDrawing);
     load(drawing, "<root><sizes>text<size>8</size><other>9</other></sizes><shapes/></root>");
     EXPECT_EQ(drawing.sizes, (std::vector<float>{0.5, -3, 8}));
     EXPECT_EQ(drawing.shapes.size(), 2u);
@@ -421,8 +283,7 @@ TEST_F(SerialTest, MakesOnlyObjectsOfTheRightClass) {
                           "<root><shape class='Circle'><title>t</title></shape><shapes>"
                           "<shape class='None'/></shapes></root>"),
                   "Bad class='None" + end);
-        ASSERT_EQ(drawing.shapes.size(), 1u);
-        EXPECT_EQ(drawing.shapes[0], nullptr);
+        EXPECT_EQ(drawing.shapes, std::vector<Shape*>{nullptr});
         EXPECT_EQ(drawing.shape->title, "t");
         delete drawing.shape;
         EXPECT_EQ(failure(drawing, "<root><shape class='Values'/></root>"),
@@ -443,11 +304,10 @@ TEST_F(SerialTest, MakesOnlyObjectsOfTheRightClass) {
 
 /// Whatever happens to its bytes, a document is loaded or refused with a LoadFail.
 TEST(Documents, SurviveEveryCutAndEveryFlippedByte) {
-    const std::string good = fullDrawing;
-    for (std::size_t at = 0; at < good.size(); ++at) {
-        std::string flipped = good;
+    for (std::size_t at = 0; at < fullDrawing.size(); ++at) {
+        std::string flipped = fullDrawing;
         flipped[at] = static_cast<char>(flipped[at] ^ (1 << at % 8));
-        for (const std::string& bad : {good.substr(0, at), flipped}) {
+        for (const std::string& bad : {fullDrawing.substr(0, at), flipped}) {
             Drawing drawing;
             failure(drawing, bad);
         }
@@ -466,28 +326,13 @@ TEST(Floats, AreWrittenWithThePrecisionOfTheStream) {
         std::memcpy(&values.x, &bits, sizeof values.x);
         if (!std::isfinite(values.x))
             continue;
-        std::ostringstream out;
-        out << std::setprecision(9);
-        OutTag tag(out, "root");
-        values.save(tag);
         Values loaded;
-        load(loaded, out.str());
+        load(loaded, saved(values, 9));
         EXPECT_EQ(loaded.x, values.x);
         std::ostringstream byStream;
-        byStream << std::setprecision(9) << values.x;
-        EXPECT_NE(out.str().find("<x>" + byStream.str() + "</x>"), std::string::npos) << values.x;
+        byStream << std::setprecision(9) << "<x>" << values.x << "</x>";
+        EXPECT_NE(saved(values, 9).find(byStream.str()), std::string::npos) << values.x;
     }
-    Values values;
-    values.x = 1.0f / 3;
-    values.c.r = values.x;
-    std::ostringstream out;
-    out << std::fixed << std::setprecision(2) << std::hex << std::boolalpha << std::showpos;
-    OutTag tag(out, "root");
-    values.save(tag);
-    EXPECT_NE(out.str().find("<x>+0.33</x>\n    <d>+7.00</d>\n    <b>1</b>\n    <i>7</i>"),
-              std::string::npos)
-        << out.str();
-    EXPECT_NE(out.str().find("r=\"0.333333\""), std::string::npos);
 }
 
 struct Comma : std::numpunct<char> {
@@ -496,21 +341,18 @@ struct Comma : std::numpunct<char> {
     std::string do_grouping() const override { return "\3"; }
 };
 
-TEST(Numbers, HaveOneFormInEveryLocale) {
+TEST(Numbers, HaveOneFormInEveryLocaleAndStream) {
     const std::locale before = std::locale::global(std::locale(std::locale(), new Comma));
     Values values;
-    load(values, "<root><x>+1234.5</x><i>+12345</i><c r='+.5'/></root>");
+    load(values, "<root><x>+1234.5</x><i>+12345</i><c r='+.333333343'/></root>");
     std::ostringstream out;
-    out << std::fixed << std::setprecision(1);
+    out << std::fixed << std::setprecision(1) << std::hex << std::boolalpha << std::showpos;
     OutTag tag(out, "root");
     values.save(tag);
     std::locale::global(before);
-    EXPECT_EQ(values.x, 1234.5f);
-    EXPECT_EQ(values.c.r, 0.5f);
-    EXPECT_NE(out.str().find("<x>1234.5</x>\n    <d>7.0</d>\n    <b>1</b>\n    <i>12345</i>"),
-              std::string::npos)
-        << out.str();
-    EXPECT_NE(out.str().find("r=\"0.5\""), std::string::npos) << out.str();
+    EXPECT_EQ(compact(out.str()),
+              "<root><x>+1234.5</x><d>+7.0</d><b>1</b><i>12345</i><u>7</u><l>7</l><s>old</s>"
+              "<c a=\"1\" b=\"0.25\" g=\"0.5\" r=\"0.333333\"/></root>");
 }
 
 struct Angle {
@@ -562,34 +404,28 @@ struct Page : Serializable {
 
 TEST_F(SerialTest, HandlesTypesOfTheApplication) {
     Page page;
-    page.angle.degrees = 1.5;
-    page.sizes = {Size{3}, Size{4}};
     const std::string document =
-        "<root>\n    <angle>1.5&lt;</angle>\n    <sizes>\n        <size width=\"3\"/>\n"
-        "        <size width=\"4\"/>\n    </sizes>\n</root>\n";
-    EXPECT_EQ(saved(page), document);
-    Page loaded;
-    load(loaded, document);
-    EXPECT_EQ(saved(loaded), document);
-    EXPECT_EQ(failure(loaded, "<root><angle>2 degrees</angle></root>"), "");
-    EXPECT_EQ(loaded.angle.degrees, 1.5);
-    EXPECT_EQ(failure(loaded, "<root><angle>2&lt; x</angle></root>"), "Failed to scan text value");
+        "<root><angle>1.5&lt;</angle><sizes><size width=\"3\"/><size width=\"4\"/></sizes></root>";
+    load(page, document);
+    EXPECT_EQ(compact(saved(page)), document);
+    EXPECT_EQ(page.sizes.at(1).width, 4);
+    EXPECT_EQ(failure(page, "<root><angle>2 degrees</angle></root>"), "");
+    EXPECT_EQ(page.angle.degrees, 1.5);
+    EXPECT_EQ(failure(page, "<root><angle>2&lt; x</angle></root>"), "Failed to scan text value");
 }
 
 struct Named : Field {
     using Field::Field;
-    void load(Serializable* /*obj*/, pells::InTag& /*tag*/) override {}
+    void load(Serializable* /*obj*/, InTag& /*tag*/) override {}
 };
 
 TEST(Descriptions, OrderFieldsByNameAndNumberThemAsAdded) {
     const intrusive_ptr<Field> zeta = new Named("zeta");
     const intrusive_ptr<Field> alpha = new Named("alpha");
     ClassDesc desc(zeta, nullptr, alpha);
-    EXPECT_EQ(desc.size(), 2u);
     EXPECT_EQ(zeta->getOrder(), 0);
     EXPECT_EQ(alpha->getOrder(), 1);
     EXPECT_EQ(desc.getFields(), (std::vector<intrusive_ptr<Field>>{alpha, zeta}));
-    EXPECT_EQ(*desc.begin(), alpha);
     EXPECT_EQ(desc.get("zeta"), zeta);
     EXPECT_EQ(desc.get("none"), nullptr);
 
@@ -599,41 +435,25 @@ TEST(Descriptions, OrderFieldsByNameAndNumberThemAsAdded) {
     EXPECT_EQ(desc.get("alpha"), second);
     EXPECT_EQ(second->getOrder(), 2);
     EXPECT_EQ(copy.get("alpha"), alpha);
-    EXPECT_TRUE(ClassDesc().empty());
     EXPECT_EQ(makeComposite("empty", ClassDesc()), nullptr);
-}
 
-TEST_F(SerialTest, SavesACompositeWithoutFieldsAsAnEmptyElement) {
     std::ostringstream out;
     OutTag tag(out, "name");
-    pells::CompositeField("name", ClassDesc()).save(nullptr, tag);
-    pells::IgnoreField().save(nullptr, tag);
+    CompositeField("name", ClassDesc()).save(nullptr, tag);
+    IgnoreField().save(nullptr, tag);
     EXPECT_EQ(out.str(), "<name/>\n");
 }
 
-TEST_F(SerialTest, LogsTheComparisonsOfItsSort) {
-    pells_test::prefs() = {{"log", "mac"}};
-    Derived object;
-    saved(object);
-    const std::vector<std::string> lines = pells_test::logLines();
-    ASSERT_GE(lines.size(), 2u);
-    EXPECT_EQ(lines[0], "mac: FieldPtr less being called.");
-}
-
-struct Planet : pells::NamedObject<Planet> {
-    explicit Planet(const std::string& planet) : pells::NamedObject<Planet>(planet) {}
+struct Planet : NamedObject<Planet> {
+    explicit Planet(const std::string& planet) : NamedObject<Planet>(planet) {}
 };
 
 TEST(Enums, NameAnObjectOrFail) {
     Planet mars("Mars");
-    EXPECT_EQ(pells::Enum<Planet>("Mars").get(), &mars);
-    EXPECT_EQ(pells::Enum<Planet>("Mars")->getName(), "Mars");
-    try {
-        pells::Enum<Planet> none("Vulcan");
-        FAIL();
-    } catch (const pells::BadEnum& bad) {
-        EXPECT_STREQ(bad.what(), "No Enum value 'Vulcan' for Enum<(anonymous namespace)::Planet>");
-    }
+    EXPECT_EQ(Enum<Planet>("Mars").get(), &mars);
+    EXPECT_EQ(Enum<Planet>("Mars")->getName(), "Mars");
+    EXPECT_EQ(thrown<BadEnum>([] { Enum<Planet>("Vulcan"); }),
+              "No Enum value 'Vulcan' for Enum<(anonymous namespace)::Planet>");
 }
 
 }  // namespace

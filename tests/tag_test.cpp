@@ -6,16 +6,10 @@
 #include <list>
 #include <random>
 
-#include "pells/serial/serializable.h"
-#include "support/test_prefs.h"
-
 namespace {
 
 using pells::AttrMap;
-using pells::OpenTag;
 using pells::OutTag;
-using pells::Serializable;
-using pells::XMLTokenizer;
 
 typedef std::vector<std::pair<std::string, std::string>> Pairs;
 
@@ -102,59 +96,24 @@ TEST(OutTags, WriteLinesOfTheirDepth) {
               "</root>\n");
 }
 
-class InTagTest : public pells_test::LibraryTest {
-protected:
-    XMLTokenizer::Token token(XMLTokenizer::Token::TokenType type, const std::string& value) {
-        XMLTokenizer::Token made;
-        made.type = type;
-        made.value = value;
-        return made;
-    }
-
+TEST(InTags, HaveTheLastOfEqualAttributesAndCopiesTheTextFromItsStart) {
     std::istringstream in;
-    XMLTokenizer tokenizer{in};
-};
-
-TEST_F(InTagTest, TakeNameAndAttributesFromTheirToken) {
-    XMLTokenizer::Token start = token(XMLTokenizer::Token::T_OPEN, "part");
-    start.attrs = {{"x", "1"}, {"x", "2"}};
-    OpenTag root(tokenizer, start);
-    EXPECT_EQ(root.getName(), "part");
-    EXPECT_EQ(root.getAttr("x"), "2");
-    EXPECT_EQ(root.getAttr("y"), "");
-    EXPECT_EQ(root.getText(), "");
-    OpenTag child(root, token(XMLTokenizer::Token::T_OPEN, "child"));
-    EXPECT_EQ(child.getAttr("x"), "");
-    EXPECT_EQ(child.getVersion(), pells::Version(0, 0));
-}
-
-TEST_F(InTagTest, GiveACopyTheTextFromItsStart) {
-    OpenTag tag(tokenizer, token(XMLTokenizer::Token::T_TEXT, "12 13"));
-    EXPECT_EQ(tag.getName(), "");
+    pells::XMLTokenizer tokenizer(in);
+    pells::XMLTokenizer::Token token;
+    token.attrs = {{"x", "1"}, {"x", "2"}};
+    const pells::OpenTag tag(tokenizer, token);
+    EXPECT_EQ(tag.getAttr("x"), "2");
+    EXPECT_EQ(tag.getAttr("y"), "");
+    token.type = pells::XMLTokenizer::Token::T_TEXT;
+    token.value = "12 13";
+    pells::OpenTag text(tokenizer, token);
     int number = 0;
-    tag.textStream() >> number;
-    OpenTag copy(tag);
+    text.textStream() >> number;
+    pells::OpenTag copy(text);
     copy.textStream() >> number;
     EXPECT_EQ(number, 12);
-    tag.textStream() >> number;
+    text.textStream() >> number;
     EXPECT_EQ(number, 13);
-    EXPECT_EQ(tag.getText(), "12 13");
-}
-
-TEST_F(InTagTest, AcceptOnlyWhiteSpaceBehindAValue) {
-    const OpenTag tag(tokenizer, token(XMLTokenizer::Token::T_OPEN, "x"));
-    for (const char* text : {" 12 ", "12", "12\t\n\v\f\r ", "abc"}) {
-        std::istringstream scanned(text);
-        int number;
-        scanned >> number;
-        EXPECT_NO_THROW(tag.checkEndText(scanned)) << text;
-    }
-    for (const char* text : {"12x", "12 x", "12\xA0"}) {
-        std::istringstream scanned(text);
-        int number;
-        scanned >> number;
-        EXPECT_THROW(tag.checkEndText(scanned), Serializable::LoadFail) << text;
-    }
 }
 
 }  // namespace

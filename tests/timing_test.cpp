@@ -1,5 +1,3 @@
-#include <gtest/gtest.h>
-
 #include "pells/core/factory.h"
 #include "pells/log/log.h"
 #include "pells/timing/timer.h"
@@ -29,33 +27,32 @@ TEST_F(TimestampTest, CarriesAndBorrowsBetweenItsHalves) {
     EXPECT_FALSE(Timestamp(5, 0) < Timestamp(5, 0));
 }
 
+struct Case {
+    Timestamp a, b;
+    std::int32_t difference;
+};
+
 TEST_F(TimestampTest, RoundsMillisecondsUpwardAndStaysInRange) {
-    const struct {
-        Timestamp a, b;
-        std::int32_t milliseconds;
-    } cases[] = {{Timestamp(0, 2500), Timestamp(0, 1000), 2},
-                 {Timestamp(0, 1000), Timestamp(0, 2700), -1},
-                 {Timestamp(0, 1000), Timestamp(0, 2499), 0},
-                 {Timestamp(1, 0), Timestamp(0, 0), 4294967},
-                 {Timestamp(0, 0), Timestamp(1, 0), -4294966},
-                 {Timestamp(1000000, 0), Timestamp(), 2147483647},
-                 {Timestamp(), Timestamp(1000000, 0), -2147483647 - 1}};
+    const Case cases[] = {{Timestamp(0, 2500), Timestamp(0, 1000), 2},
+                          {Timestamp(0, 1000), Timestamp(0, 2700), -1},
+                          {Timestamp(0, 1000), Timestamp(0, 2499), 0},
+                          {Timestamp(1, 0), Timestamp(0, 0), 4294967},
+                          {Timestamp(0, 0), Timestamp(1, 0), -4294966},
+                          {Timestamp(1000000, 0), Timestamp(), 2147483647},
+                          {Timestamp(), Timestamp(1000000, 0), -2147483647 - 1}};
     for (const auto& each : cases)
-        EXPECT_EQ(each.a - each.b, each.milliseconds);
+        EXPECT_EQ(each.a - each.b, each.difference);
 }
 
 TEST_F(TimestampTest, DiffersInMicrosecondsFromItsNeighboursAndReportsOthers) {
-    const struct {
-        Timestamp a, b;
-        std::int32_t microseconds;
-    } quiet[] = {{Timestamp(7, 5), Timestamp(6, 0xFFFFFFFF), 6},
-                 {Timestamp(6, 0xFFFFFFFF), Timestamp(7, 5), -6},
-                 {Timestamp(1000001, 123), Timestamp(0, 50), -50},
-                 {Timestamp(0, 50), Timestamp(1000001, 123), 50},
-                 {Timestamp(2, 50), Timestamp(1000001, 123), 50},
-                 {Timestamp(0xFFFFFFFF, 1), Timestamp(0xFFFFFFFE, 3), -2}};
+    const Case quiet[] = {{Timestamp(7, 5), Timestamp(6, 0xFFFFFFFF), 6},
+                          {Timestamp(6, 0xFFFFFFFF), Timestamp(7, 5), -6},
+                          {Timestamp(1000001, 123), Timestamp(2, 50), -50},
+                          {Timestamp(0, 50), Timestamp(1000001, 123), 50},
+                          {Timestamp(2, 50), Timestamp(1000001, 123), 50},
+                          {Timestamp(0xFFFFFFFF, 1), Timestamp(0xFFFFFFFE, 3), -2}};
     for (const auto& each : quiet)
-        EXPECT_EQ(each.a.diffInMicrosec(each.b), each.microseconds);
+        EXPECT_EQ(each.a.diffInMicrosec(each.b), each.difference);
     EXPECT_FALSE(pells::Log::singleton);
 
     const std::string line =
@@ -63,7 +60,7 @@ TEST_F(TimestampTest, DiffersInMicrosecondsFromItsNeighboursAndReportsOthers) {
     EXPECT_EQ(Timestamp(10, 0).diffInMicrosec(Timestamp(5, 0)), 0);
     EXPECT_EQ(Timestamp(1000000, 123).diffInMicrosec(Timestamp(0, 50)), 73);
     EXPECT_EQ(Timestamp(3, 1).diffInMicrosec(Timestamp(1000001, 0)), 1);
-    EXPECT_EQ(pells_test::logLines(), std::vector<std::string>(3, line));
+    EXPECT_EQ(pells_test::logLines(), pells_test::Lines(3, line));
 }
 
 class StoppedClock : public Timer {
@@ -72,8 +69,8 @@ public:
 };
 
 TEST(Timer, IsMadeByTheApplicationsFactory) {
-    EXPECT_THROW(Timer::instance(), Timer::NoImplementation);
-    EXPECT_THROW(Timer::instance(), Timer::NoImplementation);
+    for (int call = 0; call < 2; ++call)
+        EXPECT_THROW(Timer::instance(), Timer::NoImplementation);
     EXPECT_EQ(pells::TimerFactory::create("Timer"), nullptr);
     const pells::Factory<Timer, StoppedClock> factory(Timer::TimerName);
     expectEqual(Timer::instance().now(), Timestamp(1, 2));

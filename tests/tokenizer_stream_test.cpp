@@ -9,17 +9,17 @@
 
 #include "pells/xml/tokenizer.h"
 #include "support/chunked_buffer.h"
+#include "support/thrown.h"
 
 namespace {
 
 using pells::XMLTokenizer;
+using pells_test::ChunkedBuffer;
 typedef XMLTokenizer::Token Token;
 
-std::size_t allocations = 0;
 std::size_t allocatedBytes = 0;
 
 void* allocate(std::size_t size) {
-    ++allocations;
     allocatedBytes += size;
     if (void* const block = std::malloc(size))
         return block;
@@ -42,12 +42,6 @@ namespace {
 
 const std::size_t pieceSizes[] = {0, 1, 2, 3, 7, 16, 1000};
 
-std::string written(const Token& token) {
-    std::ostringstream out;
-    out << token;
-    return out.str();
-}
-
 TEST(TokenizerStream, StandsRightBehindEachToken) {
     // Each line is taken by one call; character data comes with the tag that ends it.
     const std::string lines[] = {"<?xml version='1.0'?><root a='1'>",
@@ -61,7 +55,7 @@ TEST(TokenizerStream, StandsRightBehindEachToken) {
         for (const std::string& line : lines)
             text += line;
         text += "trailer";
-        pells_test::ChunkedBuffer buffer(text, size);
+        ChunkedBuffer buffer(text, size);
         std::istream in(&buffer);
         XMLTokenizer tokenizer(in);
         EXPECT_EQ(buffer.taken(), 0U);
@@ -125,171 +119,88 @@ TEST(TokenizerStream, StreamThatIsNotGoodEndsTheTokens) {
 
     std::istream without(nullptr);
     EXPECT_EQ(XMLTokenizer(without).getToken().type, Token::T_EOF);
+
+    std::istringstream strict("<a/>x");
+    strict.exceptions(std::ios_base::failbit);
+    XMLTokenizer thrower(strict);
+    EXPECT_EQ(thrower.getToken().value, "a");
+    EXPECT_THROW(thrower.getToken(), std::ios_base::failure);
+    EXPECT_EQ(thrower.getToken().type, Token::T_EOF);
 }
 
-TEST(TokenizerStream, EndIsThrownToThoseWhoAskForIt) {
-    std::istringstream in("<a/>x");
-    in.exceptions(std::ios_base::failbit);
-    XMLTokenizer tokenizer(in);
-    EXPECT_EQ(tokenizer.getToken().value, "a");
-    EXPECT_THROW(tokenizer.getToken(), std::ios_base::failure);
-    EXPECT_EQ(tokenizer.getToken().type, Token::T_EOF);
-}
+TEST(TokenizerStream, DamageGoesToTheCallerOrEndsTheTokens) {
+    for (const std::string end :
+         {"", " ", "<", "<a", "<a ", "<a b", "<a b='c", "<a b='c'", "</a", "<a/", "text",
+          "text<!-- ", "text &am", "&#6", "<!-", "<!-- -", "<?xml", "<?xml version='1.0"}) {
+        const std::string text = "<first/>" + end;
+        for (const std::size_t size : pieceSizes) {
+            SCOPED_TRACE(end + " in pieces of " + std::to_string(size));
+            ChunkedBuffer throwing(text, size, true);
+            std::istream loud(&throwing);
+            loud.exceptions(std::ios_base::badbit);
+            XMLTokenizer tokenizer(loud);
+            EXPECT_EQ(tokenizer.getToken().value, "first");
+            EXPECT_EQ(pells_test::thrown<std::runtime_error>([&] { tokenizer.getToken(); }),
+                      "damaged");
+            EXPECT_TRUE(loud.bad());
+            loud.clear();
+            EXPECT_EQ(tokenizer.getToken().type, Token::T_EOF);
 
-/// Throws where the text ends.
-class BreakingBuffer : public pells_test::ChunkedBuffer {
-public:
-    using ChunkedBuffer::ChunkedBuffer;
-
-protected:
-    int_type underflow() override {
-        const int_type next = ChunkedBuffer::underflow();
-        return traits_type::eq_int_type(next, traits_type::eof())
-                   ? throw std::runtime_error("damaged member")
-                   : next;
-    }
-};
-
-class TokenizerBreak : public ::testing::TestWithParam<std::string> {};
-
-TEST_P(TokenizerBreak, GoesToTheCallerOrEndsTheTokens) {
-    const std::string text = "<first/>" + GetParam();
-    for (const std::size_t size : pieceSizes) {
-        BreakingBuffer throwing(text, size);
-        std::istream loud(&throwing);
-        loud.exceptions(std::ios_base::badbit);
-        XMLTokenizer tokenizer(loud);
-        EXPECT_EQ(tokenizer.getToken().value, "first");
-        try {
-            tokenizer.getToken();
-            ADD_FAILURE() << "nothing was thrown";
-        } catch (const std::runtime_error& failure) {
-            EXPECT_STREQ(failure.what(), "damaged member");
+            ChunkedBuffer quiet(text, size, true);
+            std::istream in(&quiet);
+            XMLTokenizer ending(in);
+            ending.getToken();
+            while (ending.getToken().type == Token::T_TEXT) {
+            }
+            EXPECT_TRUE(in.bad());
+            EXPECT_EQ(ending.getToken().type, Token::T_EOF);
         }
-        EXPECT_TRUE(loud.bad());
-        loud.clear();
-        EXPECT_EQ(tokenizer.getToken().type, Token::T_EOF);
-
-        BreakingBuffer quiet(text, size);
-        std::istream in(&quiet);
-        XMLTokenizer ending(in);
-        ending.getToken();
-        while (ending.getToken().type == Token::T_TEXT) {
-        }
-        EXPECT_TRUE(in.bad());
-        EXPECT_EQ(ending.getToken().type, Token::T_EOF);
     }
-}
-
-INSTANTIATE_TEST_SUITE_P(Xml, TokenizerBreak,
-                         ::testing::Values("", " ", "<", "<a", "<a ", "<a b", "<a b='c", "<a b='c'",
-                                           "</a", "<a/", "text", "text<!-- ", "text &am", "&#6",
-                                           "<!-", "<!-- -", "<?xml", "<?xml version='1.0"),
-                         [](const auto& each) { return "At" + std::to_string(each.index); });
-
-TEST(TokenizerStream, BreakAtTheFirstCharacterLeaksNothing) {
+    // At the first character, nothing leaks.
     const std::string nothing;
-    BreakingBuffer buffer(nothing, 1);
+    ChunkedBuffer buffer(nothing, 1, true);
     std::istream in(&buffer);
     in.exceptions(std::ios_base::badbit);
     EXPECT_THROW(XMLTokenizer tokenizer(in), std::runtime_error);
 }
 
-/// Gives a filling of any length between two texts, 4096 characters at a time.
-class LongBuffer : public std::streambuf {
-public:
-    LongBuffer(const std::string& before, char filling, std::size_t count, const std::string& after)
-        : head(before), tail(after), remaining(count) {
-        std::fill(std::begin(block), std::end(block), filling);
+TEST(TokenizerMemory, DoesNotDependOnWhatIsSkipped) {
+    const char single[] = "Token: 1 (T_SINGLE) <a/>";
+    const struct {
+        const char* text;  // with a "*" for 20 million of the filling
+        char filling;
+        const char* token;  // "" when the filling is part of it
+    } cases[] = {{"<!--*--><a/>", 'x', single},
+                 {" *<a/>", '\n', single},
+                 {"<a */>", ' ', single},
+                 {"<?xml version='*'?><a/>", '1', single},
+                 {"&*;", 'n', "Token: 4 (T_TEXT) \"?\""},
+                 {"&#x*41;", '0', "Token: 4 (T_TEXT) \"A\""},
+                 {"x*", '>', ""},
+                 {"<a b='*'/>", '\t', ""},
+                 {"<*/>", 'n', ""}};
+    for (const auto& each : cases) {
+        SCOPED_TRACE(each.text);
+        const std::size_t length = 20000000;
+        std::string text = each.text;
+        text.replace(text.find('*'), 1, length, each.filling);
+        std::istringstream in(text);
+        const std::size_t before = allocatedBytes;
+        XMLTokenizer tokenizer(in);
+        const Token token = tokenizer.getToken();
+        // A string that grows with the text doubles, and so do the blocks it leaves behind.
+        EXPECT_LT(allocatedBytes - before, *each.token == '\0' ? 4 * length : 4096);
+        std::ostringstream written;
+        written << token;
+        if (*each.token == '\0')
+            EXPECT_GE(written.str().size(), length);
+        else
+            EXPECT_EQ(written.str(), each.token);
+        EXPECT_EQ(tokenizer.getToken().type, Token::T_EOF);
     }
-
-protected:
-    int_type underflow() override {
-        if (!headGiven) {
-            headGiven = true;
-            show(&head[0], head.size());
-        } else if (remaining > 0) {
-            const std::size_t size = std::min(remaining, sizeof block);
-            remaining -= size;
-            show(block, size);
-        } else if (!tailGiven) {
-            tailGiven = true;
-            show(&tail[0], tail.size());
-        }
-        return gptr() == egptr() ? traits_type::eof() : traits_type::to_int_type(*gptr());
-    }
-
-private:
-    void show(char* text, std::size_t size) { setg(text, text, text + size); }
-
-    std::string head;
-    std::string tail;
-    std::size_t remaining;
-    bool headGiven = false;
-    bool tailGiven = false;
-    char block[4096];
-};
-
-struct LongInput {
-    const char* name;
-    std::string before;
-    char filling;
-    std::string after;
-    std::string token;
-    bool kept;  ///< whether the filling is part of the token
-};
-
-class TokenizerMemory : public ::testing::TestWithParam<LongInput> {};
-
-TEST_P(TokenizerMemory, DoesNotDependOnWhatIsSkipped) {
-    const std::size_t length = 20000000;
-    LongBuffer buffer(GetParam().before, GetParam().filling, length, GetParam().after);
-    std::istream in(&buffer);
-    const std::size_t before = allocatedBytes;
-    XMLTokenizer tokenizer(in);
-    const Token token = tokenizer.getToken();
-    // A string that grows with the text doubles, and so do the blocks it leaves behind.
-    EXPECT_LT(allocatedBytes - before, GetParam().kept ? 4 * length : 4096);
-    if (GetParam().kept)
-        EXPECT_GE(written(token).size(), length);
-    else
-        EXPECT_EQ(written(token), GetParam().token);
-    EXPECT_EQ(tokenizer.getToken().type, Token::T_EOF);
 }
 
-const char single[] = "Token: 1 (T_SINGLE) <a/>";
-
-INSTANTIATE_TEST_SUITE_P(
-    Xml, TokenizerMemory,
-    ::testing::Values(LongInput{"Comment", "<!--", 'x', "--><a/>", single, false},
-                      LongInput{"Space", " ", '\n', "<a/>", single, false},
-                      LongInput{"SpaceInTag", "<a ", ' ', "/>", single, false},
-                      LongInput{"Declaration", "<?xml version='", '1', "'?><a/>", single, false},
-                      LongInput{"EntityName", "&", 'n', ";", "Token: 4 (T_TEXT) \"?\"", false},
-                      LongInput{"Number", "&#x", '0', "41;", "Token: 4 (T_TEXT) \"A\"", false},
-                      LongInput{"Text", "x", '>', "", "", true},
-                      LongInput{"Value", "<a b='", '\t', "'/>", "", true},
-                      LongInput{"Name", "<", 'n', "/>", "", true}),
-    [](const auto& each) { return std::string(each.param.name); });
-
-TEST(TokenizerStream, MakesOneAllocationAString) {
-    const std::string longText(100, 'x');
-    const std::string tag = "<a b='" + longText + "' c='short' d='" + longText + "'>";
-    std::istringstream in(tag + tag + "  " + longText +
-                          " <a-name-that-is-too-long-to-be-stored-inside/>");
-    XMLTokenizer tokenizer(in);
-    tokenizer.getToken();
-    const std::size_t start = allocations;
-    const Token open = tokenizer.getToken();
-    EXPECT_EQ(open.attrs.size(), 3U);
-    EXPECT_EQ(allocations - start, 3U) << "two values and the list";
-    const Token text = tokenizer.getToken();
-    const Token name = tokenizer.getToken();
-    EXPECT_EQ(name.type, Token::T_SINGLE);
-    EXPECT_EQ(allocations - start, 5U) << "a text and a name";
-}
-
-TEST(TokenizerStream, LogsTokens) {
+TEST(Tokens, AreLogged) {
     std::ostringstream out;
     out << std::hex << std::showbase;
     Token token;
@@ -300,15 +211,10 @@ TEST(TokenizerStream, LogsTokens) {
         out << token << '\n';
     }
     EXPECT_EQ(out.str(),
-              "Token: 0 (T_IGNORE) v\n"
-              "Token: 1 (T_SINGLE) <v a=\"1\" b=\"\"<\"/>\n"
-              "Token: 2 (T_OPEN) <v a=\"1\" b=\"\"<\">\n"
-              "Token: 3 (T_CLOSE) </v>\n"
-              "Token: 4 (T_TEXT) \"v\"\n"
-              "Token: 5 (T_EOF) v\n"
-              "Token: 6 (**bad**) v\n"
-              "Token: 16 (**bad**) v\n"
-              "Token: -1 (**bad**) v\n");
+              "Token: 0 (T_IGNORE) v\nToken: 1 (T_SINGLE) <v a=\"1\" b=\"\"<\"/>\n"
+              "Token: 2 (T_OPEN) <v a=\"1\" b=\"\"<\">\nToken: 3 (T_CLOSE) </v>\n"
+              "Token: 4 (T_TEXT) \"v\"\nToken: 5 (T_EOF) v\nToken: 6 (**bad**) v\n"
+              "Token: 16 (**bad**) v\nToken: -1 (**bad**) v\n");
 }
 
 }  // namespace

@@ -15,7 +15,7 @@ function(pells_add_tool_test name)
     add_dependencies(${name} pells_tool)
 endfunction()
 
-pells_add_tool_test(tool_test SOURCES tool_test.cpp LIBRARIES pells_archive_writer)
+pells_add_tool_test(tool_test SOURCES tool_test.cpp LIBRARIES ZLIB::ZLIB)
 pells_add_tool_test(swatch_test
     SOURCES swatch_test.cpp ../tools/sphere.cpp ../tools/thumbnail.cpp
     LIBRARIES pells_archive_writer)

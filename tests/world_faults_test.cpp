@@ -22,14 +22,6 @@ public:
     std::string received;
 };
 
-/// A text that does not compress.
-std::string noise(std::size_t size) {
-    std::string text;
-    for (unsigned state = 1; text.size() < size; state = state * 1664525u + 1013904223u)
-        text += static_cast<char>(state >> 24);
-    return text;
-}
-
 class WorldFaults : public pells_test::AssetRootTest {
 protected:
     WorldFaults() { getrlimit(RLIMIT_FSIZE, &fileSizes); }
@@ -44,7 +36,7 @@ protected:
     void becomeOrdinaryUser() const {
         if (geteuid() != 0)
             return;
-        EXPECT_EQ(chmod(scratch.path().c_str(), 0777), 0);
+        EXPECT_EQ(chmod(scratch.path(".").c_str(), 0777), 0);
         EXPECT_EQ(chmod("root", 0777), 0);
         ASSERT_EQ(seteuid(65534), 0);
     }
@@ -93,7 +85,7 @@ TEST_F(WorldFaults, FilesThatVanishAreMissedOneByOne) {
 }
 
 TEST_F(WorldFaults, ArchivesThatChangeWhileTheyAreReadHarmNoOther) {
-    writeArchive("cut.asset", {{"long", noise(400000)}, {"first", "1"}});
+    writeArchive("cut.asset", {{"long", pells_test::noise(400000)}, {"first", "1"}});
     writeArchive("other.asset", {{"other", "fine"}});
     const auto container = manager().getFileStream("long", true);
     std::istream& in = container->getStream();
@@ -121,7 +113,7 @@ TEST_F(WorldFaults, AFolderThatMayNotBeReadHidesItselfOnly) {
     EXPECT_EQ(read("open/alias"), "y");
     EXPECT_EQ(read("closed/inside"), "(null)");
     EXPECT_EQ(manager().listfiles("closed", false), std::vector<std::string>());
-    const std::vector<std::string> errors = linesUnder("error");
+    const pells_test::Lines errors = pells_test::logLines("error: ");
     EXPECT_EQ(errors.at(0), "Bad .asset file: root/closed.asset: Can't open pell file");
     chmod("root/closed", 0700);
 }
@@ -158,13 +150,14 @@ TEST_F(WorldFaults, SingletonsMayLogWhenTheyDie) {
     PELLS_LOG("app", "a log comes first");
     Mourner::instance();
     pells::SingletonList::freeSingletons();
-    EXPECT_EQ(linesUnder("app"), (std::vector<std::string>{"a log comes first", "farewell"}));
+    EXPECT_EQ(pells_test::logLines("app: "),
+              (std::vector<std::string>{"a log comes first", "farewell"}));
 
     // Here the log dies first, and another one is made for the farewell.
     Mourner::instance();
     PELLS_LOG("app", "a log comes second");
     pells::SingletonList::freeSingletons();
-    EXPECT_EQ(linesUnder("app"), std::vector<std::string>{"farewell"});
+    EXPECT_EQ(pells_test::logLines("app: "), std::vector<std::string>{"farewell"});
     EXPECT_EQ(pells::Log::singleton, nullptr);
 }
 

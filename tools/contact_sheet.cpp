@@ -1,19 +1,14 @@
 #include "tools/contact_sheet.h"
 
-#include <algorithm>
 #include <cmath>
-#include <cstdint>
 #include <utility>
-
-#include "tools/atomic_file.h"
-#include "tools/canvas.h"
 
 namespace pells_tool {
 
 namespace {
 
 // Distances in pixels.
-const int margin = 24;
+const int margin = SheetRows::margin;
 const int gap = 14;
 const int padding = 12;
 const int cellWidth = ContactSheet::boxWidth + 2 * padding;
@@ -22,7 +17,6 @@ const int headerHeight = 64;
 const int footerHeight = 48;
 const double noteLeading = 13;
 
-const Paint background = 0xECEFF3;
 const Paint cardPaint = 0xFFFFFF;
 const Paint boxPaint = 0xF4F6F8;
 const TextStyle titleStyle = {19, 0x1F2933, true};
@@ -53,24 +47,9 @@ MoodPaints paintsOf(SheetCell::Mood mood) {
 }
 
 /// Wider than high, as screens are.
-int columnsFor(std::size_t cells) {
-    const double wanted = std::ceil(std::sqrt(1.8 * static_cast<double>(cells)));
-    return static_cast<int>(std::min(10.0, std::max(2.0, wanted)));
-}
-
-int sheetWidth(int columns) {
-    return 2 * margin + columns * cellWidth + (columns - 1) * gap;
-}
-
-/// \throws pells::FileError for more than the PNG format can hold.
-unsigned sheetHeight(const std::string& path, std::size_t cells, int columns) {
-    const std::uint64_t rows =
-        (cells + static_cast<std::size_t>(columns) - 1) / static_cast<std::size_t>(columns);
-    const std::uint64_t height =
-        headerHeight + footerHeight + rows * static_cast<std::uint64_t>(cellHeight + gap);
-    if (height > 0x7FFFFFFF)
-        throw pells::FileError(path, "Too many pictures for one sheet");
-    return static_cast<unsigned>(height);
+SheetLayout layoutFor(std::size_t cells) {
+    return {
+        sheetColumns(cells, 1.8, 2, 10), cellWidth, cellHeight, gap, headerHeight, footerHeight};
 }
 
 void drawPicture(Canvas& canvas, const Box& box, const Thumbnail& picture) {
@@ -109,12 +88,11 @@ double drawCaption(Canvas& canvas, const Box& box, const SheetCell& cell) {
     return baseline;
 }
 
-void drawCell(Canvas& canvas, double left, double top, const SheetCell& cell) {
+void drawCell(Canvas& canvas, double left, const SheetCell& cell) {
     const MoodPaints paints = paintsOf(cell.mood);
     const TextStyle noteStyle = {10, paints.text, false};
-    const Box card = {left, top, cellWidth, cellHeight};
-    const Box box = {left + padding, top + padding, ContactSheet::boxWidth,
-                     ContactSheet::boxHeight};
+    const Box card = {left, 0, cellWidth, cellHeight};
+    const Box box = {left + padding, padding, ContactSheet::boxWidth, ContactSheet::boxHeight};
     canvas.fill(card, cardPaint, 8);
     canvas.outline(card, paints.border, 8);
     canvas.fill(box, paints.box, 4);
@@ -124,7 +102,7 @@ void drawCell(Canvas& canvas, double left, double top, const SheetCell& cell) {
                   noteStyle);
     } else {
         drawPicture(canvas, box, cell.picture);
-        drawNotes(canvas, {box.x, notesTop, box.width, top + cellHeight - 6 - notesTop}, cell.notes,
+        drawNotes(canvas, {box.x, notesTop, box.width, cellHeight - 6 - notesTop}, cell.notes,
                   noteStyle);
     }
 }
@@ -146,50 +124,23 @@ void drawLegend(Canvas& canvas, double right, double baseline) {
 
 }  // namespace
 
-/// A full-width piece of the sheet.
-class ContactSheet::Strip : public Canvas {
-public:
-    Strip(int columns, int height) : Canvas(sheetWidth(columns), height) {
-        fill({0, 0, static_cast<double>(width()), static_cast<double>(height)}, background);
-    }
-};
-
 ContactSheet::ContactSheet(const std::string& path, const std::string& title, std::size_t cells)
-    : columns(columnsFor(cells)),
-      png(path, static_cast<unsigned>(sheetWidth(columns)), sheetHeight(path, cells, columns)),
-      filled(0) {
-    Strip header(columns, headerHeight);
+    : layout(layoutFor(cells)), rows(path, layout, cells, "Too many pictures for one sheet") {
+    Canvas header = rows.strip(layout.header);
     header.text(title, margin, 40, header.width() - 2 * margin, titleStyle);
-    writeStrip(header);
+    rows.write(header);
 }
 
-ContactSheet::~ContactSheet() = default;
-
 void ContactSheet::add(const SheetCell& cell) {
-    if (!row)
-        row.reset(new Strip(columns, cellHeight + gap));
-    drawCell(*row, margin + filled * (cellWidth + gap), 0, cell);
-    if (++filled == columns) {
-        writeStrip(*row);
-        row.reset();
-        filled = 0;
-    }
+    rows.add([&cell](Canvas& canvas, double left) { drawCell(canvas, left, cell); });
 }
 
 void ContactSheet::finish(const std::string& summary) {
-    if (row)
-        writeStrip(*row);
-    Strip footer(columns, footerHeight);
+    Canvas footer = rows.strip(layout.footer);
     footer.text(summary, margin, 20, footer.width() - 2 * margin, summaryStyle);
-    if (columns > 2)
+    if (layout.columns > 2)
         drawLegend(footer, footer.width() - margin, 20);
-    writeStrip(footer);
-    png.finish();
-}
-
-void ContactSheet::writeStrip(const Strip& strip) {
-    for (int y = 0; y < strip.height(); ++y)
-        png.writeRow(reinterpret_cast<const unsigned char*>(strip.row(y).data()));
+    rows.finish(footer);
 }
 
 }  // namespace pells_tool

@@ -1,11 +1,10 @@
 #pragma once
 
 #include <cstddef>
-#include <memory>
 #include <string>
 #include <vector>
 
-#include "tools/png_file.h"
+#include "tools/sheet_rows.h"
 #include "tools/thumbnail.h"
 
 namespace pells_tool {
@@ -34,7 +33,6 @@ public:
     /// \param cells the number of cells that will be added.
     /// \throws pells::FileError here and below when the file cannot be written.
     ContactSheet(const std::string& path, const std::string& title, std::size_t cells);
-    ~ContactSheet();
 
     /// Adds the next cell. The file is written up to the last full row.
     void add(const SheetCell& cell);
@@ -47,14 +45,8 @@ public:
     static constexpr int boxHeight = 156;
 
 private:
-    class Strip;
-
-    void writeStrip(const Strip& strip);
-
-    int columns;
-    PngFile png;
-    std::unique_ptr<Strip> row;
-    int filled;
+    SheetLayout layout;
+    SheetRows rows;
 };
 
 }  // namespace pells_tool

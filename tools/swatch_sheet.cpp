@@ -6,15 +6,12 @@
 #include <cstdio>
 #include <vector>
 
-#include "tools/atomic_file.h"
-#include "tools/canvas.h"
-
 namespace pells_tool {
 
 namespace {
 
 // Distances in pixels.
-const int margin = 24;
+const int margin = SheetRows::margin;
 const int gap = 18;
 const int padding = 12;
 const int boxWidth = 236;
@@ -25,7 +22,6 @@ const int chipWidth = 30;
 const int chipHeight = 14;
 const double columnWidth = 37;
 
-const Paint background = 0xECEFF3;
 const Paint cardPaint = 0xFFFFFF;
 const Paint cardBorder = 0xD5DAE0;
 const Paint boxPaint = 0x39424E;
@@ -38,25 +34,9 @@ const TextStyle valueStyle = {11, 0x1F2933, false};
 const TextStyle badgeStyle = {17, 0xFFFFFF, true};
 
 /// Few in one row, more in a sheet that is a little wider than high.
-int columnsFor(std::size_t cards) {
-    const double wanted = std::ceil(std::sqrt(1.3 * static_cast<double>(cards)));
-    return cards <= 4 ? static_cast<int>(cards)
-                      : static_cast<int>(std::min(6.0, std::max(3.0, wanted)));
-}
-
-int sheetWidth(int columns) {
-    return 2 * margin + columns * cardWidth + (columns - 1) * gap;
-}
-
-/// \throws pells::FileError for more than the PNG format can hold.
-unsigned sheetHeight(const std::string& path, std::size_t cards, int columns) {
-    const std::uint64_t rows =
-        (cards + static_cast<std::size_t>(columns) - 1) / static_cast<std::size_t>(columns);
-    const std::uint64_t height =
-        2 * margin - gap + rows * static_cast<std::uint64_t>(cardHeight + gap);
-    if (height > 0x7FFFFFFF)
-        throw pells::FileError(path, std::string("Too many materials for one picture"));
-    return static_cast<unsigned>(height);
+SheetLayout layoutFor(std::size_t cards) {
+    const int columns = cards <= 4 ? static_cast<int>(cards) : sheetColumns(cards, 1.3, 3, 6);
+    return {columns, cardWidth, cardHeight, gap, margin, margin - gap};
 }
 
 std::string number(float value) {
@@ -191,46 +171,17 @@ void drawCard(Canvas& canvas, double left, const SwatchCard& card) {
 
 }  // namespace
 
-/// A full-width piece of the sheet.
-class SwatchSheet::Strip : public Canvas {
-public:
-    Strip(int columns, int height) : Canvas(sheetWidth(columns), height) {
-        fill({0, 0, static_cast<double>(width()), static_cast<double>(height)}, background);
-    }
-    void writeTo(PngFile& file) const {
-        for (int y = 0; y < height(); ++y)
-            file.writeRow(reinterpret_cast<const unsigned char*>(row(y).data()));
-    }
-};
-
 SwatchSheet::SwatchSheet(const std::string& path, std::size_t cards)
-    : columns(columnsFor(cards)),
-      png(path, static_cast<unsigned>(sheetWidth(columns)), sheetHeight(path, cards, columns)),
-      filled(0) {
-    Strip(columns, margin).writeTo(png);
+    : rows(path, layoutFor(cards), cards, "Too many materials for one picture") {
+    rows.write(rows.strip(margin));
 }
-
-SwatchSheet::~SwatchSheet() = default;
 
 void SwatchSheet::add(const SwatchCard& card) {
-    if (!row)
-        row.reset(new Strip(columns, cardHeight + gap));
-    drawCard(*row, margin + filled * (cardWidth + gap), card);
-    if (++filled == columns)
-        writeRow();
-}
-
-void SwatchSheet::writeRow() {
-    row->writeTo(png);
-    row.reset();
-    filled = 0;
+    rows.add([&card](Canvas& canvas, double left) { drawCard(canvas, left, card); });
 }
 
 void SwatchSheet::finish() {
-    if (row)
-        writeRow();
-    Strip(columns, margin - gap).writeTo(png);
-    png.finish();
+    rows.finish(rows.strip(margin - gap));
 }
 
 }  // namespace pells_tool

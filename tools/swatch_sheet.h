@@ -1,11 +1,10 @@
 #pragma once
 
 #include <cstddef>
-#include <memory>
 #include <string>
 
 #include "pells/material/material.h"
-#include "tools/png_file.h"
+#include "tools/sheet_rows.h"
 #include "tools/thumbnail.h"
 
 namespace pells_tool {
@@ -26,7 +25,6 @@ public:
     /// \param cards the number of cards that will be added, at least 1.
     /// \throws pells::FileError here and below when the file cannot be written.
     SwatchSheet(const std::string& path, std::size_t cards);
-    ~SwatchSheet();
 
     /// Adds the next card. The file is written up to the last full row.
     void add(const SwatchCard& card);
@@ -37,14 +35,7 @@ public:
     static constexpr int sphereSize = 196;
 
 private:
-    class Strip;
-
-    void writeRow();
-
-    int columns;
-    PngFile png;
-    std::unique_ptr<Strip> row;
-    int filled;
+    SheetRows rows;
 };
 
 }  // namespace pells_tool

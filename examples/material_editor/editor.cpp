@@ -176,13 +176,13 @@ std::optional<Words> Editor::completions(const Words& before) const {
     if (kind == "MATERIAL")
         return materialNames();
     if (kind == "PART")
-        return SetColor::parts();
+        return colorParts();
     return kind == "[COMMAND]" ? commandNames() : Words();
 }
 
 // Commands that become steps of the history.
 
-void Editor::perform(const boost::intrusive_ptr<Step>& step) {
+void Editor::perform(const StepPtr& step) {
     const std::string problem = step->problem();
     if (!problem.empty())
         throw std::runtime_error(problem);
@@ -191,32 +191,32 @@ void Editor::perform(const boost::intrusive_ptr<Step>& step) {
 }
 
 void Editor::create(const Words& arguments) {
-    perform(new CreateMaterial(arguments[0]));
+    perform(createMaterial(arguments[0]));
 }
 
 void Editor::color(const Words& arguments) {
     const pells::Color color{parseNumber(arguments[2]), parseNumber(arguments[3]),
                              parseNumber(arguments[4]), numberAt(arguments, 5, 1)};
-    perform(new SetColor(arguments[0], arguments[1], color));
+    perform(setColor(arguments[0], arguments[1], color));
 }
 
 void Editor::shininess(const Words& arguments) {
-    perform(new SetShininess(arguments[0], parseNumber(arguments[1])));
+    perform(setShininess(arguments[0], parseNumber(arguments[1])));
 }
 
 void Editor::texture(const Words& arguments) {
-    perform(new SetTexture(arguments[0], arguments[1], numberAt(arguments, 2, 1),
-                           numberAt(arguments, 3, 0)));
+    perform(setTexture(arguments[0], arguments[1], numberAt(arguments, 2, 1),
+                       numberAt(arguments, 3, 0)));
 }
 
 void Editor::blend(const Words& arguments) {
-    perform(new BlendMaterials(arguments[0], arguments[1]));
+    perform(blendMaterials(arguments[0], arguments[1]));
 }
 
 void Editor::load(const Words& arguments) {
     pells::Material material;
     readFile(arguments[1], materialRoot, material);
-    perform(new LoadMaterial(arguments[0], material));
+    perform(loadMaterial(arguments[0], material));
 }
 
 // Moving through the history.

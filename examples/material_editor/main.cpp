@@ -2,7 +2,7 @@
 //
 //     material_editor [--prefs FILE] [SCRIPT]
 //
-// Start reading at steps.h, the undoable steps, and editor.cpp, the commands. settings.h and
+// Start reading at steps.cpp, the undoable steps, and editor.cpp, the commands. settings.h and
 // clock.h supply what the library wants from every application.
 
 #include <pells/core/prefs.h>

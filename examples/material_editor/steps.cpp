@@ -7,9 +7,11 @@
 #include <cctype>
 #include <initializer_list>
 #include <iterator>
+#include <limits>
 #include <sstream>
 #include <utility>
 
+#include "exact_color.h"
 #include "files.h"
 #include "materials.h"
 
@@ -23,14 +25,6 @@ using pells::makeField;
 using pells::Material;
 
 namespace {
-
-// The names are what saved histories call the classes, so they never change.
-const pells::SerializableFactory<CreateMaterial> createMaterialFactory("CreateMaterial");
-const pells::SerializableFactory<SetColor> setColorFactory("SetColor");
-const pells::SerializableFactory<SetShininess> setShininessFactory("SetShininess");
-const pells::SerializableFactory<SetTexture> setTextureFactory("SetTexture");
-const pells::SerializableFactory<BlendMaterials> blendMaterialsFactory("BlendMaterials");
-const pells::SerializableFactory<LoadMaterial> loadMaterialFactory("LoadMaterial");
 
 /// The colours of a material that can be set.
 struct Part {
@@ -155,150 +149,210 @@ std::string Step::missingMaterial() const {
     return unknown(material);
 }
 
-// Creating a material.
+namespace {
 
-std::string CreateMaterial::problem() const {
-    if (Materials::instance().find(materialName()))
-        return "there is a material '" + materialName() + "' already";
-    return badName(materialName());
+// Each kind of step is a class of its own. The default constructors are for the factories, which
+// make a step before its fields are read: numbers begin as NaN, so that a field that a file lacks
+// is found by problem().
+
+const float unset = std::numeric_limits<float>::quiet_NaN();
+
+class CreateMaterial : public Step {
+public:
+    CreateMaterial() = default;
+    explicit CreateMaterial(const std::string& materialName) : Step(materialName) {}
+
+    // Without fields of its own, it is saved as a Step is.
+
+    std::string problem() const override {
+        if (Materials::instance().find(materialName()))
+            return "there is a material '" + materialName() + "' already";
+        return badName(materialName());
+    }
+
+    std::string describe() const override { return command("new", materialName()); }
+
+    void change(Material& /*edited*/) const override {}
+};
+
+class SetColor : public Step {
+public:
+    SetColor() = default;
+    SetColor(const std::string& materialName, const std::string& partName, const Color& newColor)
+        : Step(materialName), part(partName), color{newColor} {}
+
+    boost::intrusive_ptr<Field> getField(const std::string& name) override {
+        return makeComposite(name,
+                             ClassDesc(Step::getField("super"), makeField("part", &SetColor::part),
+                                       makeField("color", &SetColor::color)));
+    }
+
+    std::string problem() const override {
+        const std::string badPart = findPart(part) ? "" : "a material has no colour '" + part + "'";
+        return firstOf({missingMaterial(), badPart, badColor(color.value)});
+    }
+
+    std::string describe() const override { return command("color", materialName(), part, color); }
+
+    void change(Material& edited) const override { (edited.*findPart(part)->set)(color.value); }
+
+private:
+    std::string part;
+    ExactColor color;
+};
+
+class SetShininess : public Step {
+public:
+    SetShininess() = default;
+    SetShininess(const std::string& materialName, float newShininess)
+        : Step(materialName), shininess(newShininess) {}
+
+    boost::intrusive_ptr<Field> getField(const std::string& name) override {
+        return makeComposite(name, ClassDesc(Step::getField("super"),
+                                             makeField("shininess", &SetShininess::shininess)));
+    }
+
+    std::string problem() const override {
+        return firstOf({missingMaterial(), badShininess(shininess)});
+    }
+
+    std::string describe() const override {
+        return command("shininess", materialName(), shininess);
+    }
+
+    void change(Material& edited) const override { edited.setShininess(shininess); }
+
+private:
+    float shininess = unset;
+};
+
+class SetTexture : public Step {
+public:
+    SetTexture() = default;
+    SetTexture(const std::string& materialName, const std::string& textureName, float textureScale,
+               float textureAngle)
+        : Step(materialName), texture(textureName), scale(textureScale), angle(textureAngle) {}
+
+    boost::intrusive_ptr<Field> getField(const std::string& name) override {
+        return makeComposite(
+            name, ClassDesc(Step::getField("super"), makeField("texture", &SetTexture::texture),
+                            makeField("scale", &SetTexture::scale),
+                            makeField("angle", &SetTexture::angle)));
+    }
+
+    std::string problem() const override {
+        return firstOf({missingMaterial(), badTexture(texture, scale, angle)});
+    }
+
+    std::string describe() const override {
+        return command("texture", materialName(), '"' + texture + '"', scale, angle);
+    }
+
+    void change(Material& edited) const override { edited.setTextureData(texture, scale, angle); }
+
+private:
+    std::string texture;
+    float scale = unset;
+    float angle = unset;
+};
+
+class BlendMaterials : public Step {
+public:
+    BlendMaterials() = default;
+    BlendMaterials(const std::string& materialName, const std::string& otherName)
+        : Step(materialName), other(otherName) {}
+
+    boost::intrusive_ptr<Field> getField(const std::string& name) override {
+        return makeComposite(
+            name, ClassDesc(Step::getField("super"), makeField("other", &BlendMaterials::other)));
+    }
+
+    std::string problem() const override { return firstOf({missingMaterial(), unknown(other)}); }
+
+    std::string describe() const override { return command("blend", materialName(), other); }
+
+    void change(Material& edited) const override {
+        edited.blendWith(*Materials::instance().find(other));
+    }
+
+private:
+    // A name will do: when the step is redone, the other material is again what it was.
+    std::string other;
+};
+
+class LoadMaterial : public Step {
+public:
+    LoadMaterial() = default;
+    LoadMaterial(const std::string& materialName, const Material& loadedMaterial)
+        : Step(materialName) {
+        // A material's document rounds colours. Going through one now makes the step hold what its
+        // saved form will say, so that replaying gives the same material.
+        Material original = loadedMaterial;
+        std::istringstream document(toXml("material", original));
+        fromXml(document, "material", loaded);
+    }
+
+    boost::intrusive_ptr<Field> getField(const std::string& name) override {
+        return makeComposite(
+            name, ClassDesc(Step::getField("super"), makeField("loaded", &LoadMaterial::loaded)));
+    }
+
+    std::string problem() const override {
+        return firstOf(
+            {badName(materialName()), badColor(loaded.ambient()), badColor(loaded.diffuse()),
+             badColor(loaded.specular()), badColor(loaded.emissive()),
+             badShininess(loaded.shininess()),
+             badTexture(loaded.textureName(), loaded.textureScale(), loaded.textureAngle())});
+    }
+
+    std::string describe() const override { return command("load", materialName()); }
+
+    void change(Material& edited) const override { edited = loaded; }
+
+private:
+    Material loaded;
+};
+
+// The names are what saved histories call the classes, so they never change.
+const pells::SerializableFactory<CreateMaterial> createMaterialFactory("CreateMaterial");
+const pells::SerializableFactory<SetColor> setColorFactory("SetColor");
+const pells::SerializableFactory<SetShininess> setShininessFactory("SetShininess");
+const pells::SerializableFactory<SetTexture> setTextureFactory("SetTexture");
+const pells::SerializableFactory<BlendMaterials> blendMaterialsFactory("BlendMaterials");
+const pells::SerializableFactory<LoadMaterial> loadMaterialFactory("LoadMaterial");
+
+}  // namespace
+
+StepPtr createMaterial(const std::string& material) {
+    return new CreateMaterial(material);
 }
 
-std::string CreateMaterial::describe() const {
-    return command("new", materialName());
+StepPtr setColor(const std::string& material, const std::string& part, const Color& color) {
+    return new SetColor(material, part, color);
 }
 
-void CreateMaterial::change(Material& /*edited*/) const {}
-
-// Setting a colour.
-
-SetColor::SetColor(const std::string& materialName, const std::string& partName,
-                   const Color& newColor)
-    : Step(materialName), part(partName), color{newColor} {}
-
-std::vector<std::string> SetColor::parts() {
+std::vector<std::string> colorParts() {
     std::vector<std::string> names;
     for (const Part& each : allParts)
         names.emplace_back(each.name);
     return names;
 }
 
-boost::intrusive_ptr<Field> SetColor::getField(const std::string& name) {
-    return makeComposite(name,
-                         ClassDesc(Step::getField("super"), makeField("part", &SetColor::part),
-                                   makeField("color", &SetColor::color)));
+StepPtr setShininess(const std::string& material, float shininess) {
+    return new SetShininess(material, shininess);
 }
 
-std::string SetColor::problem() const {
-    const std::string badPart = findPart(part) ? "" : "a material has no colour '" + part + "'";
-    return firstOf({missingMaterial(), badPart, badColor(color.value)});
+StepPtr setTexture(const std::string& material, const std::string& texture, float scale,
+                   float angle) {
+    return new SetTexture(material, texture, scale, angle);
 }
 
-std::string SetColor::describe() const {
-    return command("color", materialName(), part, color);
+StepPtr blendMaterials(const std::string& material, const std::string& other) {
+    return new BlendMaterials(material, other);
 }
 
-void SetColor::change(Material& edited) const {
-    (edited.*findPart(part)->set)(color.value);
-}
-
-// Setting the shininess.
-
-SetShininess::SetShininess(const std::string& materialName, float newShininess)
-    : Step(materialName), shininess(newShininess) {}
-
-boost::intrusive_ptr<Field> SetShininess::getField(const std::string& name) {
-    return makeComposite(
-        name, ClassDesc(Step::getField("super"), makeField("shininess", &SetShininess::shininess)));
-}
-
-std::string SetShininess::problem() const {
-    return firstOf({missingMaterial(), badShininess(shininess)});
-}
-
-std::string SetShininess::describe() const {
-    return command("shininess", materialName(), shininess);
-}
-
-void SetShininess::change(Material& edited) const {
-    edited.setShininess(shininess);
-}
-
-// Setting the texture.
-
-SetTexture::SetTexture(const std::string& materialName, const std::string& textureName,
-                       float textureScale, float textureAngle)
-    : Step(materialName), texture(textureName), scale(textureScale), angle(textureAngle) {}
-
-boost::intrusive_ptr<Field> SetTexture::getField(const std::string& name) {
-    return makeComposite(
-        name,
-        ClassDesc(Step::getField("super"), makeField("texture", &SetTexture::texture),
-                  makeField("scale", &SetTexture::scale), makeField("angle", &SetTexture::angle)));
-}
-
-std::string SetTexture::problem() const {
-    return firstOf({missingMaterial(), badTexture(texture, scale, angle)});
-}
-
-std::string SetTexture::describe() const {
-    return command("texture", materialName(), '"' + texture + '"', scale, angle);
-}
-
-void SetTexture::change(Material& edited) const {
-    edited.setTextureData(texture, scale, angle);
-}
-
-// Blending.
-
-BlendMaterials::BlendMaterials(const std::string& materialName, const std::string& otherName)
-    : Step(materialName), other(otherName) {}
-
-boost::intrusive_ptr<Field> BlendMaterials::getField(const std::string& name) {
-    return makeComposite(
-        name, ClassDesc(Step::getField("super"), makeField("other", &BlendMaterials::other)));
-}
-
-std::string BlendMaterials::problem() const {
-    return firstOf({missingMaterial(), unknown(other)});
-}
-
-std::string BlendMaterials::describe() const {
-    return command("blend", materialName(), other);
-}
-
-void BlendMaterials::change(Material& edited) const {
-    edited.blendWith(*Materials::instance().find(other));
-}
-
-// Loading a material.
-
-LoadMaterial::LoadMaterial(const std::string& materialName, const Material& loadedMaterial)
-    : Step(materialName) {
-    // A material's document rounds colours. Going through one now makes the step hold what its
-    // saved form will say, so that replaying gives the same material.
-    Material original = loadedMaterial;
-    std::istringstream document(toXml("material", original));
-    fromXml(document, "material", loaded);
-}
-
-boost::intrusive_ptr<Field> LoadMaterial::getField(const std::string& name) {
-    return makeComposite(
-        name, ClassDesc(Step::getField("super"), makeField("loaded", &LoadMaterial::loaded)));
-}
-
-std::string LoadMaterial::problem() const {
-    return firstOf(
-        {badName(materialName()), badColor(loaded.ambient()), badColor(loaded.diffuse()),
-         badColor(loaded.specular()), badColor(loaded.emissive()), badShininess(loaded.shininess()),
-         badTexture(loaded.textureName(), loaded.textureScale(), loaded.textureAngle())});
-}
-
-std::string LoadMaterial::describe() const {
-    return command("load", materialName());
-}
-
-void LoadMaterial::change(Material& edited) const {
-    edited = loaded;
+StepPtr loadMaterial(const std::string& material, const Material& loaded) {
+    return new LoadMaterial(material, loaded);
 }
 
 }  // namespace material_editor

@@ -4,21 +4,16 @@
 #include <pells/serial/field.h>
 #include <pells/undo/undoable_step.h>
 
-#include <limits>
 #include <optional>
 #include <string>
 #include <vector>
-
-#include "exact_color.h"
 
 namespace material_editor {
 
 /// One edit of one material, named by the material's name in Materials.
 ///
 /// A derived class says what may be wrong with it, how it changes a material, and what its fields
-/// are. This class does, undoes and replays it. The default constructors are for the factories,
-/// which make a step before its fields are read: numbers begin as NaN, so that a field that a file
-/// lacks is found by problem().
+/// are. This class does, undoes and replays it.
 class Step : public pells::UndoableStep {
 public:
     /// Reads the step, which replays it.
@@ -65,113 +60,29 @@ private:
     bool done = false;
 };
 
+typedef boost::intrusive_ptr<Step> StepPtr;
+
 /// Makes a material with the default values.
-class CreateMaterial : public Step {
-public:
-    CreateMaterial() = default;
-    explicit CreateMaterial(const std::string& materialName) : Step(materialName) {}
+StepPtr createMaterial(const std::string& material);
 
-    // Without fields of its own, it is saved as a Step is.
-    std::string problem() const override;
-    std::string describe() const override;
+/// Sets one of the colours. \param part one of colorParts().
+StepPtr setColor(const std::string& material, const std::string& part, const pells::Color& color);
 
-protected:
-    void change(pells::Material& edited) const override;
-};
+/// What can be coloured: "ambient", "ambient-and-diffuse", and so on.
+std::vector<std::string> colorParts();
 
-/// Sets one of the colours.
-class SetColor : public Step {
-public:
-    SetColor() = default;
-    SetColor(const std::string& materialName, const std::string& partName,
-             const pells::Color& newColor);
-
-    /// What can be coloured: "ambient", "ambient-and-diffuse", and so on.
-    static std::vector<std::string> parts();
-
-    boost::intrusive_ptr<pells::Field> getField(const std::string& name) override;
-    std::string problem() const override;
-    std::string describe() const override;
-
-protected:
-    void change(pells::Material& edited) const override;
-
-private:
-    std::string part;
-    ExactColor color;
-};
-
-class SetShininess : public Step {
-public:
-    SetShininess() = default;
-    SetShininess(const std::string& materialName, float newShininess);
-
-    boost::intrusive_ptr<pells::Field> getField(const std::string& name) override;
-    std::string problem() const override;
-    std::string describe() const override;
-
-protected:
-    void change(pells::Material& edited) const override;
-
-private:
-    float shininess = std::numeric_limits<float>::quiet_NaN();
-};
+StepPtr setShininess(const std::string& material, float shininess);
 
 /// Sets the texture's name, scale and angle in degrees; an empty name takes the texture away.
-class SetTexture : public Step {
-public:
-    SetTexture() = default;
-    SetTexture(const std::string& materialName, const std::string& textureName, float textureScale,
-               float textureAngle);
-
-    boost::intrusive_ptr<pells::Field> getField(const std::string& name) override;
-    std::string problem() const override;
-    std::string describe() const override;
-
-protected:
-    void change(pells::Material& edited) const override;
-
-private:
-    std::string texture;
-    float scale = std::numeric_limits<float>::quiet_NaN();
-    float angle = std::numeric_limits<float>::quiet_NaN();
-};
+StepPtr setTexture(const std::string& material, const std::string& texture, float scale,
+                   float angle);
 
 /// Mixes another material into one, half and half.
-class BlendMaterials : public Step {
-public:
-    BlendMaterials() = default;
-    BlendMaterials(const std::string& materialName, const std::string& otherName);
-
-    boost::intrusive_ptr<pells::Field> getField(const std::string& name) override;
-    std::string problem() const override;
-    std::string describe() const override;
-
-protected:
-    void change(pells::Material& edited) const override;
-
-private:
-    // A name will do: when the step is redone, the other material is again what it was.
-    std::string other;
-};
+StepPtr blendMaterials(const std::string& material, const std::string& other);
 
 /// Puts a whole material, read from a file, in the place of one or beside the others.
 ///
 /// The step holds the material itself: a history replays without the file.
-class LoadMaterial : public Step {
-public:
-    LoadMaterial() = default;
-    LoadMaterial(const std::string& materialName, const pells::Material& loadedMaterial);
-
-    boost::intrusive_ptr<pells::Field> getField(const std::string& name) override;
-    std::string problem() const override;
-    std::string describe() const override;
-
-protected:
-    void change(pells::Material& edited) const override;
-
-private:
-    pells::Material loaded;
-};
+StepPtr loadMaterial(const std::string& material, const pells::Material& loaded);
 
 }  // namespace material_editor

@@ -2,7 +2,6 @@
 
 #include <boost/filesystem/operations.hpp>
 #include <ctime>
-#include <iterator>
 #include <string>
 #include <utility>
 #include <vector>
@@ -39,20 +38,7 @@ protected:
     /// The bytes of an asset, or "(null)".
     static std::string read(const std::string& name) {
         const auto container = manager().getFileStream(name, true);
-        if (!container)
-            return "(null)";
-        return std::string(std::istreambuf_iterator<char>(container->getStream()),
-                           std::istreambuf_iterator<char>());
-    }
-
-    /// The lines of the log under one tag, without it.
-    static std::vector<std::string> linesUnder(const std::string& tag) {
-        std::vector<std::string> lines;
-        for (const std::string& line : logLines()) {
-            if (line.compare(0, tag.size() + 2, tag + ": ") == 0)
-                lines.push_back(line.substr(tag.size() + 2));
-        }
-        return lines;
+        return container ? readAll(container->getStream()) : "(null)";
     }
 };
 

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cstring>
 #include <memory>
+#include <stdexcept>
 #include <streambuf>
 #include <string>
 
@@ -13,7 +14,9 @@ namespace pells_test {
 class ChunkedBuffer : public std::streambuf {
 public:
     /// \param size characters in a piece; 0: the buffer shows no piece, only single characters.
-    ChunkedBuffer(const std::string& whole, std::size_t size) : text(whole), chunk(size) {}
+    /// \param breaks whether it throws where the text ends.
+    ChunkedBuffer(const std::string& whole, std::size_t size, bool breaks = false)
+        : text(whole), chunk(size), damaged(breaks) {}
 
     /// Characters that were taken from the buffer.
     std::size_t taken() const { return given - static_cast<std::size_t>(egptr() - gptr()); }
@@ -21,7 +24,7 @@ public:
 protected:
     int_type underflow() override {
         if (given == text.size())
-            return traits_type::eof();
+            return end();
         if (chunk != 0) {
             const std::size_t size = std::min(chunk, text.size() - given);
             piece.reset(new char[size]);
@@ -36,12 +39,17 @@ protected:
     int_type uflow() override {
         if (chunk != 0)
             return std::streambuf::uflow();
-        return given == text.size() ? traits_type::eof() : traits_type::to_int_type(text[given++]);
+        return given == text.size() ? end() : traits_type::to_int_type(text[given++]);
     }
 
 private:
+    int_type end() const {
+        return damaged ? throw std::runtime_error("damaged") : traits_type::eof();
+    }
+
     const std::string& text;
     std::size_t chunk;
+    bool damaged;
     std::size_t given = 0;
     std::unique_ptr<char[]> piece;
 };

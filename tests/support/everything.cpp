@@ -1,9 +1,5 @@
 #include "support/everything.h"
 
-#include <sstream>
-
-#include "pells/xml/tag.h"
-
 namespace pells_test {
 
 namespace {
@@ -34,29 +30,6 @@ boost::intrusive_ptr<pells::Field> Everything::getField(const std::string& name)
                                makeField("matrices", &Everything::matrices),
                                makeField("materials", &Everything::materials),
                                makeField("children", &Everything::children)));
-}
-
-std::string saved(pells::Serializable& object, int precision) {
-    std::ostringstream out;
-    out.precision(precision);
-    out.exceptions(std::ios_base::badbit);
-    pells::OutTag tag(out, "root");
-    object.save(tag);
-    return out.str();
-}
-
-void load(pells::Serializable& object, const std::string& document) {
-    typedef pells::XMLTokenizer::Token Token;
-    std::istringstream in(document);
-    pells::XMLTokenizer tokenizer(in);
-    const Token token = tokenizer.getToken();
-    if (token.type == Token::T_SINGLE) {
-        pells::SingleTag root(tokenizer, token);
-        object.load(root, nullptr);
-    } else if (token.type == Token::T_OPEN) {
-        pells::OpenTag root(tokenizer, token);
-        object.load(root, nullptr);
-    }
 }
 
 }  // namespace pells_test

@@ -8,6 +8,7 @@
 #include "pells/material/material.h"
 #include "pells/serial/member_field.h"
 #include "pells/undo/undo_redo_sequence.h"
+#include "support/documents.h"
 
 namespace pells_test {
 
@@ -45,13 +46,5 @@ public:
     std::vector<pells::Material> materials;
     std::vector<boost::intrusive_ptr<Everything>> children;
 };
-
-/// The object's document.
-std::string saved(pells::Serializable& object, int precision = 6);
-
-/// Reads the element that a document begins with.
-///
-/// \throws pells::Serializable::LoadFail for a document that cannot be read, without tags too.
-void load(pells::Serializable& object, const std::string& document);
 
 }  // namespace pells_test

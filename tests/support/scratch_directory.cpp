@@ -2,10 +2,11 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <boost/filesystem/fstream.hpp>
 #include <boost/filesystem/operations.hpp>
 #include <iterator>
-#include <sstream>
+#include <random>
 
 #include "pells/log/log.h"
 
@@ -39,24 +40,49 @@ void ScratchDirectory::enter() {
     fs::current_path(folder);
 }
 
-std::string readFile(const std::string& path) {
-    fs::ifstream in(path, std::ios::binary);
-    EXPECT_TRUE(in.is_open()) << path;
+std::string readAll(std::istream& in) {
     return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
 }
 
-std::vector<std::string> logLines() {
+std::string readFile(const std::string& path) {
+    fs::ifstream in(path, std::ios::binary);
+    EXPECT_TRUE(in.is_open()) << path;
+    return readAll(in);
+}
+
+Lines files() {
+    Lines names;
+    for (const fs::directory_entry& entry : fs::directory_iterator(".")) {
+        if (entry.path().filename() != "pells.log")
+            names.push_back(entry.path().filename().string());
+    }
+    return sorted(names);
+}
+
+Lines logLines(const std::string& start) {
     if (pells::Log::singleton)
         pells::Log::singleton->close();
-    std::istringstream text(readFile("pells.log"));
-    std::vector<std::string> lines;
-    const std::size_t headerLines = 3;
-    std::size_t number = 0;
-    for (std::string line; std::getline(text, line);) {
-        if (number++ >= headerLines)
-            lines.push_back(line);
+    fs::ifstream in("pells.log");
+    EXPECT_TRUE(in.is_open());
+    Lines lines;
+    int number = 0;
+    for (std::string line; std::getline(in, line);) {
+        if (++number > 3 && line.compare(0, start.size(), start) == 0)
+            lines.push_back(line.substr(start.size()));
     }
     return lines;
+}
+
+Lines sorted(Lines lines) {
+    std::sort(lines.begin(), lines.end());
+    return lines;
+}
+
+std::string noise(std::size_t size) {
+    std::mt19937 random(7);
+    std::string bytes(size, '\0');
+    std::generate(bytes.begin(), bytes.end(), [&] { return static_cast<char>(random()); });
+    return bytes;
 }
 
 }  // namespace pells_test

@@ -1,9 +1,12 @@
 #pragma once
 
+#include <istream>
 #include <string>
 #include <vector>
 
 namespace pells_test {
+
+typedef std::vector<std::string> Lines;
 
 /// A new empty folder below the system's folder for temporary files, removed with all it holds.
 class ScratchDirectory {
@@ -12,8 +15,6 @@ public:
     ~ScratchDirectory();
     ScratchDirectory(const ScratchDirectory&) = delete;
     ScratchDirectory& operator=(const ScratchDirectory&) = delete;
-
-    const std::string& path() const { return folder; }
 
     /// The path of a file in the folder.
     std::string path(const std::string& name) const { return folder + "/" + name; }
@@ -29,11 +30,22 @@ private:
     std::string previousDirectory;
 };
 
+/// What is left to be read.
+std::string readAll(std::istream& in);
+
 /// The bytes of a file; fails the test when it cannot be read.
 std::string readFile(const std::string& path);
 
+/// The names in the current directory in byte order, "pells.log" aside.
+Lines files();
+
 /// The lines of "pells.log" in the current directory without its three header lines, after closing
-/// a log that is alive.
-std::vector<std::string> logLines();
+/// a log that is alive; only those that begin with `start`, which they leave out.
+Lines logLines(const std::string& start = "");
+
+Lines sorted(Lines lines);
+
+/// Bytes that cannot be compressed, the same ones each time.
+std::string noise(std::size_t size);
 
 }  // namespace pells_test

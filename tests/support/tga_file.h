@@ -4,16 +4,13 @@
 
 namespace pells_test {
 
-/// A TGA header that claims a picture of some size; flags 0x20 says that rows come top first.
-inline std::string tgaHeader(int width, int height, int depth, int flags = 0x20) {
-    std::string header(18, '\0');
-    header[2] = depth == 8 ? 3 : 2;
-    header[12] = static_cast<char>(width & 0xFF);
-    header[13] = static_cast<char>(width >> 8);
-    header[14] = static_cast<char>(height & 0xFF);
-    header[15] = static_cast<char>(height >> 8);
-    header[16] = static_cast<char>(depth);
-    header[17] = static_cast<char>(flags);
+/// A TGA header that claims a picture of some size; flags 0x20 says that rows come top first. Type
+/// 0 stands for the plain type of the depth.
+inline std::string tgaHeader(int width, int height, int depth, int flags = 0x20, int type = 0) {
+    std::string header(12, '\0');
+    header[2] = static_cast<char>(type != 0 ? type : depth == 8 ? 3 : 2);
+    for (const int number : {width, width >> 8, height, height >> 8, depth, flags})
+        header += static_cast<char>(number & 0xFF);
     return header;
 }
 

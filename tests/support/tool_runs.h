@@ -4,12 +4,11 @@
 #include <png.h>
 #include <sys/wait.h>
 
-#include <algorithm>
-#include <boost/filesystem/operations.hpp>
 #include <cstdint>
 #include <cstdlib>
 #include <cstring>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "support/scratch_directory.h"
@@ -25,6 +24,9 @@ struct Outcome {
     std::string out;
     std::string err;
 };
+
+/// Arguments of the tool, and what it says behind the beginning of its line.
+typedef std::pair<const char*, const char*> Failing;
 
 /// Each test has a folder to run the tool in, and one beside it for what the tool prints.
 class ToolRuns : public ::testing::Test {
@@ -45,24 +47,27 @@ protected:
 
     Outcome pells(const std::string& arguments) { return shell("\"$PELLS\" " + arguments); }
 
-    /// The names in the current folder, the log's aside.
-    static std::vector<std::string> files() {
-        std::vector<std::string> names;
-        for (const boost::filesystem::directory_entry& entry :
-             boost::filesystem::directory_iterator(".")) {
-            if (entry.path().filename() != "pells.log")
-                names.push_back(entry.path().filename().string());
-        }
-        std::sort(names.begin(), names.end());
-        return names;
+    /// Expects one line that says what, where and why; a status that tells wrong usage from other
+    /// failures; nothing on standard output; no file made, and one that exists as it was.
+    void expectFailure(const std::string& command, const std::string& line,
+                       const std::string& existing) {
+        SCOPED_TRACE(command);
+        const Lines before = files();
+        const std::string bytes = readFile(existing);
+        const Outcome outcome = pells(command);
+        EXPECT_EQ(outcome.status, line.find("(see --help)") != std::string::npos ? 2 : 1);
+        EXPECT_EQ(outcome.err, line + "\n");
+        EXPECT_EQ(outcome.out, "");
+        EXPECT_EQ(files(), before);
+        EXPECT_EQ(readFile(existing), bytes);
     }
 
     ScratchDirectory printed;
     ScratchDirectory scratch;
 };
 
-/// A decoded PNG: 0xRRGGBB each.
-inline std::vector<std::uint32_t> decodePng(const std::string& path, unsigned& width) {
+/// The pixels of a PNG picture, 0xRRGGBB each.
+inline std::vector<std::uint32_t> decodePng(const std::string& path) {
     png_image image;
     std::memset(&image, 0, sizeof image);
     image.version = PNG_IMAGE_VERSION;
@@ -70,25 +75,11 @@ inline std::vector<std::uint32_t> decodePng(const std::string& path, unsigned& w
     image.format = PNG_FORMAT_RGB;
     std::vector<unsigned char> bytes(PNG_IMAGE_SIZE(image));
     EXPECT_TRUE(png_image_finish_read(&image, nullptr, bytes.data(), 0, nullptr)) << image.message;
-    width = image.width;
     std::vector<std::uint32_t> pixels;
     for (std::size_t i = 0; i + 2 < bytes.size(); i += 3)
         pixels.push_back(std::uint32_t{bytes[i]} << 16 | std::uint32_t{bytes[i + 1]} << 8 |
                          bytes[i + 2]);
     return pixels;
-}
-
-/// A TGA picture: a header and what follows it.
-inline std::string tga(int type, unsigned width, unsigned height, int depth,
-                       const std::string& pixels) {
-    std::string header(18, '\0');
-    header[2] = static_cast<char>(type);
-    header[12] = static_cast<char>(width);
-    header[13] = static_cast<char>(width >> 8);
-    header[14] = static_cast<char>(height);
-    header[15] = static_cast<char>(height >> 8);
-    header[16] = static_cast<char>(depth);
-    return header + pixels;
 }
 
 }  // namespace pells_test
