@@ -11,6 +11,7 @@
 #include <sstream>
 #include <stdexcept>
 
+#include "exact_color.h"
 #include "files.h"
 #include "materials.h"
 #include "steps.h"
