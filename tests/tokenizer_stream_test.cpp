@@ -1,9 +1,7 @@
-// What the tokenizer does to its stream and takes of the memory.
+// What the tokenizer does to its stream.
 
 #include <gtest/gtest.h>
 
-#include <cstdlib>
-#include <new>
 #include <sstream>
 #include <stdexcept>
 
@@ -16,29 +14,6 @@ namespace {
 using pells::XMLTokenizer;
 using pells_test::ChunkedBuffer;
 typedef XMLTokenizer::Token Token;
-
-std::size_t allocatedBytes = 0;
-
-void* allocate(std::size_t size) {
-    allocatedBytes += size;
-    if (void* const block = std::malloc(size))
-        return block;
-    throw std::bad_alloc();
-}
-
-}  // namespace
-
-void* operator new(std::size_t size) {
-    return allocate(size);
-}
-void operator delete(void* block) noexcept {
-    std::free(block);
-}
-void operator delete(void* block, std::size_t) noexcept {
-    std::free(block);
-}
-
-namespace {
 
 const std::size_t pieceSizes[] = {0, 1, 2, 3, 7, 16, 1000};
 
@@ -162,42 +137,6 @@ TEST(TokenizerStream, DamageGoesToTheCallerOrEndsTheTokens) {
     std::istream in(&buffer);
     in.exceptions(std::ios_base::badbit);
     EXPECT_THROW(XMLTokenizer tokenizer(in), std::runtime_error);
-}
-
-TEST(TokenizerMemory, DoesNotDependOnWhatIsSkipped) {
-    const char single[] = "Token: 1 (T_SINGLE) <a/>";
-    const struct {
-        const char* text;  // with a "*" for 20 million of the filling
-        char filling;
-        const char* token;  // "" when the filling is part of it
-    } cases[] = {{"<!--*--><a/>", 'x', single},
-                 {" *<a/>", '\n', single},
-                 {"<a */>", ' ', single},
-                 {"<?xml version='*'?><a/>", '1', single},
-                 {"&*;", 'n', "Token: 4 (T_TEXT) \"?\""},
-                 {"&#x*41;", '0', "Token: 4 (T_TEXT) \"A\""},
-                 {"x*", '>', ""},
-                 {"<a b='*'/>", '\t', ""},
-                 {"<*/>", 'n', ""}};
-    for (const auto& each : cases) {
-        SCOPED_TRACE(each.text);
-        const std::size_t length = 20000000;
-        std::string text = each.text;
-        text.replace(text.find('*'), 1, length, each.filling);
-        std::istringstream in(text);
-        const std::size_t before = allocatedBytes;
-        XMLTokenizer tokenizer(in);
-        const Token token = tokenizer.getToken();
-        // A string that grows with the text doubles, and so do the blocks it leaves behind.
-        EXPECT_LT(allocatedBytes - before, *each.token == '\0' ? 4 * length : 4096);
-        std::ostringstream written;
-        written << token;
-        if (*each.token == '\0')
-            EXPECT_GE(written.str().size(), length);
-        else
-            EXPECT_EQ(written.str(), each.token);
-        EXPECT_EQ(tokenizer.getToken().type, Token::T_EOF);
-    }
 }
 
 TEST(Tokens, AreLogged) {
