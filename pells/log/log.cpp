@@ -8,6 +8,7 @@
 #include "pells/core/prefs.h"
 #include "pells/core/strings.h"
 #include "pells/log/exit_hooks.h"
+#include "pells/log/number_format.h"
 
 namespace pells {
 
@@ -69,6 +70,9 @@ Log::Log()
       flushEach(false),
       teeStream(debugStream, logFile),
       serialNumber(++logsMade) {
+    // An application that has chosen another locale for its streams finds its forms in the log.
+    if (teeStream.getloc() == std::locale::classic())
+        teeStream.imbue(fastClassicLocale());
     readRules();
     writeHeader();
     flushEach = isEnabled("log.flush", true);
