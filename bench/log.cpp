@@ -1,13 +1,17 @@
 // Log lines that are off, on, and on disk one by one, against a logging library and plain
 // fprintf().
 
+#include <fcntl.h>
 #include <spdlog/sinks/basic_file_sink.h>
 #include <spdlog/spdlog.h>
+#include <unistd.h>
 
 #include <cstdio>
 #include <fstream>
 #include <iterator>
 #include <memory>
+#include <string>
+#include <vector>
 
 #include "bench/support/bench.h"
 #include "pells/log/log.h"
@@ -34,9 +38,13 @@ spdlog::logger makeLogger() {
     return logger;
 }
 
+std::string line(std::int64_t triangles) {
+    return fmt::format("bench.on: read {} with {} triangles in {} s\n", part, triangles,
+                       seconds(triangles));
+}
+
 void checkLastLine(benchmark::State& state, const std::string& path, std::int64_t count) {
-    const std::string expected = fmt::format("\nbench.on: read {} with {} triangles in {} s\n",
-                                             part, count - 1, seconds(count - 1));
+    const std::string expected = '\n' + line(count - 1);
     std::ifstream file(path);
     file.seekg(-static_cast<std::streamoff>(expected.size()), std::ios_base::end);
     const std::string last{std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
@@ -101,6 +109,24 @@ void addPeers(const std::string& work, std::int64_t count, bool flushed) {
     });
 }
 
+/// What closing the file after each line costs at least: three calls of the system for ready lines.
+void addLimit(const std::string& work, std::int64_t count) {
+    bench::add(work, count, "limit", [count](benchmark::State& state) {
+        std::vector<std::string> lines;
+        for (std::int64_t i = 0; i < count; ++i)
+            lines.push_back(line(i));
+        std::remove(peerFile);
+        for (auto _ : state)
+            for (const std::string& each : lines) {
+                const int file = open(peerFile, O_WRONLY | O_CREAT | O_APPEND, 0666);
+                if (write(file, each.data(), each.size()) < 0)
+                    state.SkipWithError("a line could not be written");
+                close(file);
+            }
+        checkLastLine(state, peerFile, count);
+    });
+}
+
 }  // namespace
 
 void addBenchmarks() {
@@ -110,5 +136,6 @@ void addBenchmarks() {
         addPeers("log/on", count, false);
         addLibrary("log/flushed", count, "bench.on log.flush");
         addPeers("log/flushed", count, true);
+        addLimit("log/flushed", count);
     }
 }

@@ -142,6 +142,14 @@ std::ostream& Log::getStream() {
     return teeStream;
 }
 
+std::ostream& Log::beginLine(const LogKey& key) {
+    std::ostream& stream = getStream();
+    // A width that an earlier message left behind applies to the tag.
+    if (stream.width() != 0)
+        return stream << key.tag << ": ";
+    return stream << key.lineStart;
+}
+
 void Log::flush() {
     if (flushEach)
         close();
@@ -168,12 +176,12 @@ void Log::dumpTags() {
 }
 
 void Log::writeLine(const LogKey& key, const std::string& message) {
-    getStream() << key.getTag() << ": " << message << '\n';
+    beginLine(key) << message << '\n';
     flush();
 }
 
 LogKey::LogKey(const std::string& siteTag)
-    : tag(siteTag), enabled(Log::instance().registerTag(siteTag)) {}
+    : tag(siteTag), lineStart(siteTag + ": "), enabled(Log::instance().registerTag(siteTag)) {}
 
 RecurringTag::RecurringTag(const std::string& recurringTag) : tag(recurringTag) {}
 
