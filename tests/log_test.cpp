@@ -1,8 +1,17 @@
 #include "pells/log/log.h"
 
 #include <boost/filesystem/operations.hpp>
+#include <cfenv>
+#include <cmath>
+#include <cstdint>
+#include <cstring>
 #include <fstream>
+#include <iomanip>
+#include <limits>
+#include <locale>
+#include <random>
 #include <regex>
+#include <sstream>
 
 #include "pells/core/factory.h"
 #include "pells/platform/debugger.h"
@@ -124,6 +133,79 @@ TEST_F(LogTest, IsOnDiskAfterEveryLineWhenToldToFlush) {
         PELLS_LOG("app", text.substr(5, 3));
         const std::string file = readFile("pells.log");
         EXPECT_EQ(file.substr(file.size() - text.size()), text);
+    }
+}
+
+/// Numbers whose text is easily got wrong, and random ones.
+std::vector<double> numbers() {
+    std::vector<double> all = {0, 0.1, 1.0 / 3, 0.5, 1e-300, 1e300, HUGE_VAL, std::nan("")};
+    for (double power = 1e-6; power < 1e8; power *= 10) {
+        for (const double each : {power, std::nextafter(power, 0), std::nextafter(power, 1e9),
+                                  power * 0.9999995, power * 1.234565, power * 1.2345675})
+            all.push_back(each);
+    }
+    // Exact middles between two texts: the even one is written.
+    for (const double middle : {100000.5, 100001.5, 12345.25, 1234.5625, 2.015625e0, 999999.5})
+        all.push_back(middle);
+    std::mt19937_64 random(5);
+    for (int i = 0; i < 20000; ++i) {
+        const std::uint64_t bits = random();
+        double anything;
+        std::memcpy(&anything, &bits, sizeof anything);
+        all.push_back(anything);
+        all.push_back(std::ldexp(static_cast<double>(bits >> 11), static_cast<int>(i % 40) - 70));
+        all.push_back(static_cast<double>(bits % 10000000) / 1000);
+    }
+    return all;
+}
+
+void writeNumbers(std::ostream& out) {
+    for (const double each : numbers())
+        out << each << ' ' << -each << ' ' << static_cast<float>(each) << '\n';
+    const auto writeSome = [&out] {
+        for (const double each : {0.0, -2.5, 1234.56123, 1e20})
+            out << std::setw(9) << each << each << ' ' << std::setw(7) << -25 << 99u << '\n';
+        out << true << ' ' << 2.5L << ' ' << static_cast<const void*>("") << ' ' << -1L << ' '
+            << std::numeric_limits<long long>::min() << std::numeric_limits<std::uint64_t>::max()
+            << '\n';
+    };
+    typedef std::ios_base Ios;
+    for (const auto flag : {Ios::dec, Ios::fixed, Ios::scientific, Ios::hex, Ios::oct, Ios::showpos,
+                            Ios::showpoint, Ios::uppercase, Ios::internal, Ios::boolalpha}) {
+        const auto before = out.flags(flag);
+        writeSome();
+        out.flags(before);
+    }
+    for (const int precision : {0, 3, 17, 6}) {
+        out << std::setprecision(precision) << std::setfill('*');
+        writeSome();
+    }
+    std::fesetround(FE_UPWARD);
+    writeSome();
+    std::fesetround(FE_TONEAREST);
+}
+
+class Grouping : public std::numpunct<char> {
+    char do_decimal_point() const override { return ','; }
+    char do_thousands_sep() const override { return '.'; }
+    std::string do_grouping() const override { return "\3"; }
+};
+
+TEST_F(LogTest, WritesNumbersAsAnyOtherStreamDoes) {
+    const std::locale grouping(std::locale::classic(), new Grouping);
+    for (const std::locale& global : {std::locale::classic(), grouping}) {
+        const std::locale before = std::locale::global(global);
+        std::ostringstream expected;
+        writeNumbers(expected);
+        writeNumbers(Log::instance().getStream());
+        std::istringstream lines(expected.str());
+        const std::vector<std::string> received = logLines();
+        std::size_t at = 0;
+        for (std::string line; std::getline(lines, line); ++at)
+            ASSERT_EQ(received.at(at), line) << "line " << at << " of " << received.size();
+        EXPECT_EQ(received.size(), at);
+        pells::SingletonList::freeSingletons();
+        std::locale::global(before);
     }
 }
 

@@ -8,6 +8,7 @@
 #include "pells/core/prefs.h"
 #include "pells/core/strings.h"
 #include "pells/log/exit_hooks.h"
+#include "pells/log/number_format.h"
 
 namespace pells {
 
@@ -69,6 +70,9 @@ Log::Log()
       flushEach(false),
       teeStream(debugStream, logFile),
       serialNumber(++logsMade) {
+    // An application that has chosen another locale for its streams finds its forms in the log.
+    if (teeStream.getloc() == std::locale::classic())
+        teeStream.imbue(fastClassicLocale());
     readRules();
     writeHeader();
     flushEach = isEnabled("log.flush", true);
@@ -138,6 +142,14 @@ std::ostream& Log::getStream() {
     return teeStream;
 }
 
+std::ostream& Log::beginLine(const LogKey& key) {
+    std::ostream& stream = getStream();
+    // A width that an earlier message left behind applies to the tag.
+    if (stream.width() != 0)
+        return stream << key.tag << ": ";
+    return stream << key.lineStart;
+}
+
 void Log::flush() {
     if (flushEach)
         close();
@@ -164,12 +176,12 @@ void Log::dumpTags() {
 }
 
 void Log::writeLine(const LogKey& key, const std::string& message) {
-    getStream() << key.getTag() << ": " << message << '\n';
+    beginLine(key) << message << '\n';
     flush();
 }
 
 LogKey::LogKey(const std::string& siteTag)
-    : tag(siteTag), enabled(Log::instance().registerTag(siteTag)) {}
+    : tag(siteTag), lineStart(siteTag + ": "), enabled(Log::instance().registerTag(siteTag)) {}
 
 RecurringTag::RecurringTag(const std::string& recurringTag) : tag(recurringTag) {}
 

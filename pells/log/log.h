@@ -50,6 +50,9 @@ public:
     /// The stream to write lines to; (re)opens "pells.log" if it is closed. Stays the log's.
     std::ostream& getStream();
 
+    /// getStream() after writing the beginning of a line to it: the key's tag and ": ".
+    std::ostream& beginLine(const LogKey& key);
+
     /// Puts everything written so far on disk and closes the file, if the tag "log.flush" is on.
     void flush();
 
@@ -106,7 +109,10 @@ public:
     bool isEnabled() const { return enabled; }
 
 private:
+    friend class Log;
+
     std::string tag;
+    std::string lineStart;
     bool enabled;
 };
 
@@ -140,14 +146,13 @@ private:
 /// The message is evaluated only when the tag is on. Format flags that it sets stay set on the
 /// log's stream, so it undoes them. The site's key is never destroyed: sites in destructors of
 /// static objects work to the end.
-#define PELLS_LOG(tag, message)                                               \
-    do {                                                                      \
-        static const ::pells::NoDestructor<::pells::LogKey> pellsLogKey{tag}; \
-        if (pellsLogKey->isEnabled()) {                                       \
-            ::pells::Log::instance().getStream()                              \
-                << pellsLogKey->getTag() << ": " << message << '\n';          \
-            ::pells::Log::instance().flush();                                 \
-        }                                                                     \
+#define PELLS_LOG(tag, message)                                                  \
+    do {                                                                         \
+        static const ::pells::NoDestructor<::pells::LogKey> pellsLogKey{tag};    \
+        if (pellsLogKey->isEnabled()) {                                          \
+            ::pells::Log::instance().beginLine(*pellsLogKey) << message << '\n'; \
+            ::pells::Log::instance().flush();                                    \
+        }                                                                        \
     } while (false)
 
 }  // namespace pells

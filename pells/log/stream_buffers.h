@@ -59,6 +59,7 @@ protected:
     /// Writes the pending text; on failure returns -1 and keeps it for the next time.
     int sync() override;
     typename Traits::int_type overflow(typename Traits::int_type ch = Traits::eof()) override;
+    std::streamsize xsputn(const C* text, std::streamsize count) override;
 
 public:
     /// The same as sync().

@@ -78,20 +78,9 @@ PerformanceCategory::PerformanceCategory(const std::string& categoryName)
 
 PerformanceCategory::~PerformanceCategory() = default;
 
-std::vector<PerformanceCategory*>& PerformanceCategory::_stack() {
+inline std::vector<PerformanceCategory*>& PerformanceCategory::_stack() {
     static NoDestructor<std::vector<PerformanceCategory*>> stack;
     return *stack;
-}
-
-void PerformanceCategory::start(std::uint32_t t) {
-    startTime = t;
-}
-
-std::uint32_t PerformanceCategory::stop(std::uint32_t t) {
-    const std::uint32_t elapsed = t - startTime;
-    totalTime += elapsed;
-    startTime = t;
-    return elapsed;
 }
 
 std::uint32_t PerformanceCategory::push(PerformanceCategory* category, std::uint32_t t) {
@@ -113,6 +102,14 @@ std::uint32_t PerformanceCategory::pop(std::uint32_t t) {
     if (!stack.empty())
         stack.back()->start(t);
     return ended->total();
+}
+
+inline std::uint32_t Performance::getTimestamp() {
+    static const std::uint64_t frequency = platform::counterFrequency();
+    const std::uint64_t ticks = platform::counter();
+    // Most counters tick in microseconds; dividing 64 bits would cost a good part of a reading.
+    const bool inMicroseconds = frequency == 1000000u;
+    return static_cast<std::uint32_t>(inMicroseconds ? ticks : ticks * 1000000u / frequency);
 }
 
 Performance::Performance(const std::string& label, PerformanceCategory* chargedTo)
@@ -140,19 +137,15 @@ void Performance::logEntry(const std::string& label) {
     writeLine(category->detailTag.getTag(), "Entering " + name);
 }
 
+void Performance::logEntry(const char* label) {
+    logEntry(std::string(label));
+}
+
 void Performance::logExit(std::uint32_t inclusive, std::uint32_t exclusive) const {
     std::ostringstream message;
     message << "Leaving  " << name << " (" << inclusive << " uS, " << exclusive << " uS in "
             << category->getName() << ')';
     writeLine(category->detailTag.getTag(), message.str());
-}
-
-std::uint32_t Performance::getTimestamp() {
-    static const std::uint64_t frequency = platform::counterFrequency();
-    const std::uint64_t ticks = platform::counter();
-    // Most counters tick in microseconds; dividing 64 bits would cost a good part of a reading.
-    const bool inMicroseconds = frequency == 1000000u;
-    return static_cast<std::uint32_t>(inMicroseconds ? ticks : ticks * 1000000u / frequency);
 }
 
 }  // namespace pells

@@ -26,11 +26,16 @@ public:
     ~PerformanceCategory() override;
 
     /// Counts from the time t on.
-    void start(std::uint32_t t);
+    void start(std::uint32_t t) { startTime = t; }
 
     /// Adds the time since the last start() or stop() to the total, and counts from t on.
     /// \return what was added.
-    std::uint32_t stop(std::uint32_t t);
+    std::uint32_t stop(std::uint32_t t) {
+        const std::uint32_t elapsed = t - startTime;
+        totalTime += elapsed;
+        startTime = t;
+        return elapsed;
+    }
 
     std::uint32_t total() const { return totalTime; }
 
@@ -74,6 +79,7 @@ public:
 private:
     static std::uint32_t getTimestamp();
     void logEntry(const std::string& label);
+    void logEntry(const char* label);
     void logExit(std::uint32_t inclusive, std::uint32_t exclusive) const;
 
     // Empty while the tag is off.

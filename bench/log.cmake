@@ -1,0 +1,1 @@
+pells_add_bench(bench_log SOURCES log.cpp MODULES spdlog)
