@@ -4,8 +4,11 @@
 #include <sys/stat.h>
 #endif
 
+#include <algorithm>
 #include <functional>
 #include <locale>
+#include <random>
+#include <set>
 
 #include "support/archive_bytes.h"
 #include "support/test_prefs.h"
@@ -182,6 +185,46 @@ TEST_F(PellArchive, ServesWhatComesBeforeTheEndOfACutFile) {
     EXPECT_EQ(failure, "");
     ASSERT_TRUE(archive.open("good"));
     EXPECT_EQ(readAll(archive), "good");
+}
+
+TEST_F(PellArchive, ServesTheSamePartOfADamagedMemberInPiecesOfAnySize) {
+    std::mt19937 random(5);
+    std::string bytes;
+    while (bytes.size() < 600000)
+        bytes += hexadecimal(random() >> random() % 32);
+    const std::string good = archiveOf({{"m", bytes}});
+    const std::size_t dataSize = archiveHeaderSize + deflated(bytes).size();
+    const auto damagedAt = [&good](std::size_t at, std::size_t size) {
+        return std::string(good).replace(at, size, size, '\xFF');
+    };
+    std::set<std::string> failures;
+    for (std::size_t at = dataSize / 16; at < dataSize - 200; at += dataSize / 16) {
+        pellistream archive(write(damagedAt(at, at % 2 ? 1 : 200)));
+        std::string expectedFailure;
+        std::string failure;
+        ASSERT_TRUE(archive.open("m"));
+        const std::string expected = readUntilFailure(archive, 1, expectedFailure);
+        for (const std::size_t size : {1025u, 4096u, 50000u, 300000u}) {
+            ASSERT_TRUE(archive.open("m"));
+            const std::string read = readUntilFailure(archive, size, failure);
+            EXPECT_EQ(failure, expectedFailure) << at;
+            EXPECT_LE(read.size(), expected.size() + 1024);
+            EXPECT_GT(read.size() + size + 1024, expected.size());
+            const std::size_t both = std::min(read.size(), expected.size());
+            EXPECT_EQ(read.compare(0, both, expected, 0, both), 0) << at << ' ' << size;
+        }
+        failures.insert(failure);
+    }
+    EXPECT_GT(failures.size(), 1u) << "damaged data and damaged checksums";
+
+    // Whoever asks for just the bytes of a member learns that its checksum is wrong, too.
+    pellistream archive(write(damagedAt(dataSize - 4, 4)));
+    ASSERT_TRUE(archive.open("m"));
+    std::vector<char> piece(20000);
+    for (std::size_t left = bytes.size(); left > piece.size(); left -= piece.size())
+        archive.read(piece.data(), 20000);
+    const auto rest = static_cast<std::streamsize>((bytes.size() - 1) % piece.size() + 1);
+    EXPECT_THROW(archive.read(piece.data(), rest), pells::ZlibWrapper::ZlibError);
 }
 
 TEST_F(PellArchive, DamagedMembersThrowFromEveryWayOfReading) {

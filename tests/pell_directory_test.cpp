@@ -113,4 +113,25 @@ TEST_F(PellDirectory, MeansWhatFormattedExtractionMakesOfIt) {
         EXPECT_GT(kinds[kind], 50) << kind;
 }
 
+/// Names that are told apart by their last character only, by their length or by a zero byte, some
+/// of them twice.
+std::string similarName(std::mt19937& random) {
+    const std::size_t lengths[] = {0, 1, 7, 8, 9, 16, 255, 256, 300};
+    std::string name(lengths[random() % 9], random() % 4 == 0 ? '\xFF' : 'n');
+    for (std::size_t letters = random() % 4; letters != 0; --letters)
+        name += "\0a\xFF"[random() % 3];
+    return name;
+}
+
+TEST_F(PellDirectory, SortsNamesInAnyOrderAndKeepsTheLastOfEach) {
+    std::mt19937 random(11);
+    std::string text;
+    for (int i = 0; i < 3000; ++i)
+        text += "O" + pells_test::hexadecimal(random()) + " L1 |" + similarName(random) + "\r\n";
+    const std::string path =
+        pells_test::writeArchiveFile(scratch, pells_test::archiveWithDirectory(text));
+    EXPECT_EQ(outcome([&] { return pells::pellistream(path).getDirectory(); }),
+              outcome([&] { return readPlainly(text); }));
+}
+
 }  // namespace

@@ -101,6 +101,7 @@ public:
 
     /// Selects a member; see basic_pellistream::open().
     bool open(const std::string& member);
+    void open(const Directory::value_type& entry);
 
     /// Inflates the next bytes of the selected member.
     ///
@@ -111,11 +112,16 @@ public:
     long read(C* into, long room) override;
 
 protected:
-    /// Inflates straight into the reader's memory where that is larger than the own buffer.
+    /// Inflates straight into the reader's memory where that is larger than the own buffer, and for
+    /// the first read of a member: who wants a look at its first bytes pays for no more.
     std::streamsize xsgetn(C* to, std::streamsize count) override;
 
 private:
     void readHeader();
+    void select(const Entry& entry);
+    long inflateSome(C* into, long room, int& result);
+    void inflateAhead(long room);
+    long takeInflated(C* into, long room);
     bool refill(bool wide);
     void fetch(bool wide);
 
@@ -125,6 +131,12 @@ private:
     std::vector<char> window;
     const char* ahead;
     std::uint32_t aheadCount;
+
+    /// Bytes that were inflated ahead, and what zlib said when it had made the last of them.
+    std::vector<C> inflated;
+    const C* nextInflated;
+    long inflatedCount;
+    int inflatedResult;
 };
 
 extern template class PELLS_API basic_pellibuf<char>;
@@ -164,6 +176,9 @@ public:
     /// Clears the stream's flags. Everyone who shares the stream sees the new member. Nothing is
     /// read before the first read; memory does not depend on the member's size.
     bool open(const std::string& member);
+
+    /// The same for an entry of getDirectory(), without looking for its name.
+    void open(const typename Directory::value_type& entry);
 
     /// The member names in ascending order.
     const_iterator begin() const;
