@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <boost/filesystem/operations.hpp>
 #include <ctime>
+#include <functional>
 #include <limits>
 #include <ostream>
 
@@ -36,6 +37,13 @@ bool endsWith(const std::string& text, const std::string& ending) {
 fs::file_type typeOf(const fs::path& path) {
     boost::system::error_code ignored;
     return fs::status(path, ignored).type();
+}
+
+/// AssetManager::fixName() that copies only the names that it changes.
+const std::string& fixedName(const std::string& name, std::string& converted) {
+    if (name.find('\\') == std::string::npos)
+        return name;
+    return converted = AssetManager::fixName(name);
 }
 
 /// What exists below the root under an asset's name.
@@ -98,6 +106,57 @@ fs::path assetPath(const std::string& name) {
     return fs::path(assetRoot()) / name;
 }
 
+/// Finds the entries of a cache that is complete, by hash: in a large one the path through the tree
+/// would lead through a dozen places that are not in the processor's cache.
+class AssetManager::CacheIndex {
+public:
+    explicit CacheIndex(const Cache& indexedCache) : cache(indexedCache) {
+        std::size_t size = 1;
+        while (size < cache.size() * 3 / 2)
+            size *= 2;
+        slots.resize(size);
+        for (const Cache::value_type& entry : cache)
+            add(entry);
+    }
+
+    Opener* find(const std::string& name) const {
+        const std::size_t hash = std::hash<std::string>()(name);
+        for (std::size_t step = 0; step < maxSteps; ++step) {
+            const Slot& slot = slots[(hash + step) & (slots.size() - 1)];
+            if (!slot.entry)
+                return nullptr;
+            if (slot.hash == hash && slot.entry->first == name)
+                return slot.entry->second.get();
+        }
+        const Cache::const_iterator found = cache.find(name);
+        return found == cache.end() ? nullptr : found->second.get();
+    }
+
+private:
+    struct Slot {
+        std::size_t hash = 0;
+        const Cache::value_type* entry = nullptr;
+    };
+
+    /// Names that were chosen to have the same place stay in the tree.
+    static const std::size_t maxSteps = 64;
+
+    void add(const Cache::value_type& entry) {
+        const std::size_t hash = std::hash<std::string>()(entry.first);
+        for (std::size_t step = 0; step < maxSteps; ++step) {
+            Slot& slot = slots[(hash + step) & (slots.size() - 1)];
+            if (!slot.entry) {
+                slot.hash = hash;
+                slot.entry = &entry;
+                return;
+            }
+        }
+    }
+
+    const Cache& cache;
+    std::vector<Slot> slots;
+};
+
 /// Begins the lines of one getFileStream().
 class AssetManager::OpeningPrefix {
 public:
@@ -139,6 +198,7 @@ AssetManager::AssetManager() {
     if (archives.empty())
         PELLS_LOG("asset.ctor", "Asset manager has no .asset files to check.");
     preferNewerFiles(root);
+    cacheIndex = std::make_unique<CacheIndex>(cache);
     buildAliases();
 }
 
@@ -177,9 +237,9 @@ void AssetManager::addArchive(const std::string& path) {
 void AssetManager::cacheMembers(pellistream& archive, std::int32_t timestamp) {
     // An archive's names are sorted, too, so most go right behind the one before.
     Cache::iterator place = cache.begin();
-    for (const std::string& member : archive) {
-        PELLS_LOG("asset.entries", ">>> For this asset file, found entry: " << member);
-        const Cache::iterator entry = cache.try_emplace(place, member);
+    for (const auto& member : archive.getDirectory()) {
+        PELLS_LOG("asset.entries", ">>> For this asset file, found entry: " << member.first);
+        const Cache::iterator entry = cache.try_emplace(place, member.first);
         place = std::next(entry);
         if (!entry->second || entry->second->getTimestamp() < timestamp)
             entry->second.reset(new MemberOpener(member, timestamp, &archive));
@@ -220,19 +280,18 @@ AssetManager::CacheRange AssetManager::getSubdirRange(const std::string& dir) co
 
 boost::intrusive_ptr<baseiStreamContainer> AssetManager::getFileStream(const std::string& name,
                                                                        bool flag) {
-    const std::string fixed = fixName(name);
+    std::string converted;
+    const std::string& fixed = fixedName(name, converted);
     const OpeningPrefix prefix(*this, fixed);
-    Cache::const_iterator cached = cache.find(fixed);
-    if (cached != cache.end()) {
+    if (Opener* const cached = cacheIndex->find(fixed)) {
         PELLS_LOG("asset.open", prefix << "found in cache");
-        return cached->second->open(flag);
+        return cached->open(flag);
     }
     const auto alias = aliases.find(fixed);
     if (alias != aliases.end()) {
-        cached = cache.find(alias->second);
-        if (cached != cache.end()) {
+        if (Opener* const cached = cacheIndex->find(alias->second)) {
             PELLS_LOG("asset.open", prefix << "not in cache, but alias is: " << alias->second);
-            return cached->second->open(flag);
+            return cached->open(flag);
         }
         PELLS_LOG("asset.open", prefix << "alias not in cache: " << alias->second);
     }
@@ -243,8 +302,9 @@ boost::intrusive_ptr<baseiStreamContainer> AssetManager::getFileStream(const std
 }
 
 bool AssetManager::isFile(const std::string& name) const {
-    const std::string fixed = fixName(name);
-    if (cache.count(fixed) != 0)
+    std::string converted;
+    const std::string& fixed = fixedName(name, converted);
+    if (cacheIndex->find(fixed))
         return true;
     const fs::file_type type = typeOfAsset(fixed);
     return type != fs::status_error && type != fs::file_not_found && type != fs::directory_file;
@@ -318,7 +378,7 @@ void AssetManager::listFileSystem(const std::string& dir, bool dirs, const Listi
         PELLS_LOG("asset.list", prefix << "from filesystem: " << name);
         const std::string key = start + name;
         const CacheRange below = dirs ? getSubdirRange(key) : CacheRange();
-        if (dirs ? below.first == below.second : cache.count(key) == 0)
+        if (dirs ? below.first == below.second : !cacheIndex->find(key))
             names.push_back(name);
     }
     if (error && typeOf(folder) != fs::file_not_found) {
@@ -389,15 +449,14 @@ boost::intrusive_ptr<baseiStreamContainer> AssetManager::FileOpener::open(bool /
     return nullptr;
 }
 
-AssetManager::MemberOpener::MemberOpener(std::string member, std::int32_t writeTime,
-                                         pellistream* openArchive)
-    : Opener(std::move(member), writeTime), archive(openArchive) {}
+AssetManager::MemberOpener::MemberOpener(const pellistream::Directory::value_type& entry,
+                                         std::int32_t writeTime, pellistream* openArchive)
+    : Opener(entry.first, writeTime), archive(openArchive), member(&entry) {}
 
 AssetManager::MemberOpener::~MemberOpener() = default;
 
 boost::intrusive_ptr<baseiStreamContainer> AssetManager::MemberOpener::open(bool /*flag*/) {
-    if (!archive->open(getName()))
-        return nullptr;
+    archive->open(*member);
     return boost::intrusive_ptr<baseiStreamContainer>(new MemberContainer(*archive));
 }
 

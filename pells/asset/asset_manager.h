@@ -117,6 +117,7 @@ private:
     friend class SingletonFactory<AssetManager>;
     typedef std::map<std::string, boost::intrusive_ptr<Opener>> Cache;
     typedef std::pair<Cache::const_iterator, Cache::const_iterator> CacheRange;
+    class CacheIndex;
     struct DirNode;
     class FolderWalk;
     class ListingPrefix;
@@ -147,6 +148,7 @@ private:
 
     std::vector<std::pair<std::string, std::unique_ptr<pellistream>>> archives;
     Cache cache;
+    std::unique_ptr<CacheIndex> cacheIndex;
     std::map<std::string, std::string> aliases;
     /// Last-write time of each archive.
     std::vector<std::int32_t> archiveTimes;
@@ -187,7 +189,9 @@ public:
 /// Selects a member of an archive, which outlives the opener and its containers.
 class PELLS_API AssetManager::MemberOpener : public AssetManager::Opener {
 public:
-    MemberOpener(std::string member, std::int32_t writeTime, pellistream* openArchive);
+    /// \param entry of the archive's directory.
+    MemberOpener(const pellistream::Directory::value_type& entry, std::int32_t writeTime,
+                 pellistream* openArchive);
     ~MemberOpener() override;
 
     const pellistream* getArchive() const { return archive; }
@@ -196,6 +200,7 @@ public:
 
 private:
     pellistream* archive;
+    const pellistream::Directory::value_type* member;
 };
 
 /// The answer of AssetManager::resolve().
