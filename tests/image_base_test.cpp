@@ -75,6 +75,49 @@ TEST(Pixels, ArePackedWithTheLowBitsDropped) {
     }
 }
 
+template <class Packed>
+void expectRowOfPixels(const Image_base& image, int y,
+                       void (Image_base::*rowGetter)(int, Packed*) const,
+                       Packed (Image_base::*pixelGetter)(int, int) const) {
+    const Packed untouched = 0x5A5A;
+    std::vector<Packed> row(static_cast<std::size_t>(image.getWidth()) + 1, untouched);
+    std::vector<Packed> expected = row;
+    (image.*rowGetter)(y, row.data());
+    for (int x = 0; x < image.getWidth(); ++x)
+        expected[static_cast<std::size_t>(x)] = (image.*pixelGetter)(x, y);
+    EXPECT_EQ(row, expected) << "width " << image.getWidth();
+}
+
+TEST(Pixels, AreTheSameInWholeRows) {
+    std::mt19937 random(3);
+    for (const pells::ImageFormat format : {FMT_RGB, FMT_RGBA, ownFormat}) {
+        // Blocks of several pixels leave rests of every length.
+        for (const int width : {0, 1, 2, 3, 4, 5, 6, 7, 8, 9, 17, 255, 256, 257, 1030}) {
+            TestImage image(width, 3, format);
+            for (int x = 0; x < width; ++x) {
+                const auto bits = static_cast<std::uint32_t>(random());
+                unsigned char c[4];
+                std::memcpy(c, &bits, sizeof c);
+                image.setColorAsARGB(x, 2, c[0], c[1], c[2], c[3]);
+            }
+            for (const int y : {0, 2}) {
+                expectRowOfPixels<std::uint32_t>(image, y, &Image_base::getRowAsABGR,
+                                                 &Image_base::getColorAsABGR);
+                expectRowOfPixels<std::uint32_t>(image, y, &Image_base::getRowAsARGB,
+                                                 &Image_base::getColorAsARGB);
+                expectRowOfPixels(image, y, &Image_base::getRowAsA1R5G5B5,
+                                  &Image_base::getColorAsA1R5G5B5);
+                expectRowOfPixels(image, y, &Image_base::getRowAsA4R4G4B4,
+                                  &Image_base::getColorAsA4R4G4B4);
+                expectRowOfPixels(image, y, &Image_base::getRowAsA8R3G3B2,
+                                  &Image_base::getColorAsA8R3G3B2);
+                expectRowOfPixels(image, y, &Image_base::getRowAsA2B10G10R10,
+                                  &Image_base::getColorAsA2B10G10R10);
+            }
+        }
+    }
+}
+
 TEST(Pixels, AreSetInsideTheImageOnly) {
     TestImage image(2, 2, FMT_RGB);
     for (const auto& at : {std::pair<int, int>{-1, 0}, {0, -1}, {2, 0}, {0, 2}})

@@ -46,16 +46,45 @@ __attribute__((target("ssse3"))) std::size_t swapBlocks(const unsigned char* fro
     return done;
 }
 
+/// Widens as many pixels as it can read in blocks of 16 bytes, of which it uses 12.
+///
+/// \return the pixels that are done.
+__attribute__((target("ssse3"))) std::size_t widenBlocks(const unsigned char* from,
+                                                         unsigned char* to, std::size_t pixels) {
+    const __m128i order = _mm_setr_epi8(0, 1, 2, -1, 3, 4, 5, -1, 6, 7, 8, -1, 9, 10, 11, -1);
+    const __m128i opaque = _mm_set1_epi32(static_cast<int>(0xFF000000));
+    std::size_t done = 0;
+    for (; 3 * (pixels - done) >= 16; done += 4) {
+        const __m128i block = _mm_loadu_si128(reinterpret_cast<const __m128i*>(from + 3 * done));
+        _mm_storeu_si128(reinterpret_cast<__m128i*>(to + 4 * done),
+                         _mm_or_si128(_mm_shuffle_epi8(block, order), opaque));
+    }
+    return done;
+}
+
+bool canShuffle() {
+    static const bool can = __builtin_cpu_supports("ssse3") != 0;
+    return can;
+}
+
 std::size_t swapFast(const unsigned char* from, unsigned char* to, std::size_t bytes,
                      std::size_t components) {
-    static const bool canShuffle = __builtin_cpu_supports("ssse3") != 0;
-    return canShuffle ? swapBlocks(from, to, bytes, components) : 0;
+    return canShuffle() ? swapBlocks(from, to, bytes, components) : 0;
+}
+
+std::size_t widenFast(const unsigned char* from, unsigned char* to, std::size_t pixels) {
+    return canShuffle() ? widenBlocks(from, to, pixels) : 0;
 }
 
 #else
 
 std::size_t swapFast(const unsigned char* /*from*/, unsigned char* /*to*/, std::size_t /*bytes*/,
                      std::size_t /*components*/) {
+    return 0;
+}
+
+std::size_t widenFast(const unsigned char* /*from*/, unsigned char* /*to*/,
+                      std::size_t /*pixels*/) {
     return 0;
 }
 
@@ -71,6 +100,13 @@ void copySwapped(const unsigned char* from, unsigned char* to, std::size_t bytes
     const std::size_t pixelBytes = static_cast<std::size_t>(components);
     const std::size_t done = swapFast(from, to, bytes, pixelBytes);
     swapPixels(from + done, to + done, bytes - done, pixelBytes);
+}
+
+void copyOpaque(const unsigned char* from, unsigned char* to, std::size_t pixels) {
+    for (std::size_t i = widenFast(from, to, pixels); i < pixels; ++i) {
+        std::memcpy(to + 4 * i, from + 3 * i, 3);
+        to[4 * i + 3] = 255;
+    }
 }
 
 }  // namespace pells

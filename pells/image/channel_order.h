@@ -10,4 +10,8 @@ namespace pells {
 /// \param bytes      a multiple of components. The ranges must not overlap.
 void copySwapped(const unsigned char* from, unsigned char* to, std::size_t bytes, int components);
 
+/// Copies opaque pixels of three bytes to four bytes each, the fourth 255. The ranges must not
+/// overlap.
+void copyOpaque(const unsigned char* from, unsigned char* to, std::size_t pixels);
+
 }  // namespace pells
