@@ -255,7 +255,7 @@ std::streamsize basic_pellibuf<C, Traits>::xsgetn(C* to, std::streamsize count) 
     std::streamsize done = std::min<std::streamsize>(count, this->egptr() - this->gptr());
     Traits::copy(to, this->gptr(), static_cast<std::size_t>(done));
     this->gbump(static_cast<int>(done));
-    while (count - done > this->bufferSize() || (inflater.total_out == 0 && count > done)) {
+    while (count - done > this->bufferSize()) {
         const std::streamsize most = std::numeric_limits<long>::max();
         const long got = read(to + done, static_cast<long>(std::min(count - done, most)));
         if (got <= 0)

@@ -112,8 +112,7 @@ public:
     long read(C* into, long room) override;
 
 protected:
-    /// Inflates straight into the reader's memory where that is larger than the own buffer, and for
-    /// the first read of a member: who wants a look at its first bytes pays for no more.
+    /// Inflates straight into the reader's memory where that is larger than the own buffer.
     std::streamsize xsgetn(C* to, std::streamsize count) override;
 
 private:
