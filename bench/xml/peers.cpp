@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <pugixml.hpp>
 #include <rapidxml/rapidxml.hpp>
+#include <rapidxml/rapidxml_utils.hpp>
 #include <stdexcept>
 #include <string>
 #include <string_view>
@@ -23,7 +24,7 @@ std::string contents(std::istream& in) {
     std::string all;
     std::size_t size = 0;
     do {
-        all.resize(size + std::max(size, blockSize));
+        all.resize(std::max(2 * size, std::size_t(8192)));
         in.read(&all[size], static_cast<std::streamsize>(all.size() - size));
         size += static_cast<std::size_t>(in.gcount());
     } while (in);
@@ -180,6 +181,12 @@ struct TinyXml2Tree {
     }
 };
 
+void tokensOfRapidXmlDocument(char* text, Receiver& receiver) {
+    rapidxml::xml_document<> document;
+    document.parse<rapidxml::parse_no_element_values>(text);
+    walk<RapidXmlTree>(document.first_node(), receiver);
+}
+
 }  // namespace
 
 void tokensOfPells(std::istream& in, Receiver& receiver) {
@@ -200,10 +207,13 @@ void tokensOfPugixml(std::istream& in, Receiver& receiver) {
 }
 
 void tokensOfRapidXml(std::istream& in, Receiver& receiver) {
+    rapidxml::file<> text(in);
+    tokensOfRapidXmlDocument(text.data(), receiver);
+}
+
+void tokensOfRapidXmlInMemory(std::istream& in, Receiver& receiver) {
     std::string text = contents(in);
-    rapidxml::xml_document<> document;
-    document.parse<rapidxml::parse_no_element_values>(&text[0]);
-    walk<RapidXmlTree>(document.first_node(), receiver);
+    tokensOfRapidXmlDocument(&text[0], receiver);
 }
 
 void tokensOfTinyXml2(std::istream& in, Receiver& receiver) {
