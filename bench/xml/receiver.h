@@ -31,7 +31,7 @@ public:
 
 private:
     void addToDigest(const Token& token) {
-        add(token.type);
+        add(static_cast<std::size_t>(token.type));
         add(std::hash<std::string>()(token.value));
         for (const auto& [name, value] : token.attrs) {
             add(std::hash<std::string>()(name));
