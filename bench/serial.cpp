@@ -5,8 +5,8 @@
 #include <sstream>
 
 #include "bench/serial/contestants.h"
-#include "bench/support/allocations.h"
 #include "bench/support/bench.h"
+#include "tests/support/allocations.h"
 
 namespace {
 
@@ -39,7 +39,7 @@ bool isRight(Load<TableOf> load, std::istream& in, std::int64_t entries) {
     return bench::contents(table) == bench::contents(filled<TableOf>(entries));
 }
 
-void setAllocations(benchmark::State& state, const bench::AllocationMeter& meter,
+void setAllocations(benchmark::State& state, const pells_test::AllocationMeter& meter,
                     std::int64_t entries) {
     state.counters["allocations_per_entry"] =
         static_cast<double>(meter.count()) / static_cast<double>(entries);
@@ -65,7 +65,7 @@ void measureLoad(benchmark::State& state, Load<TableOf> load, const std::string&
         loadAgain();
     }
     prepare();
-    const bench::AllocationMeter meter;
+    const pells_test::AllocationMeter meter;
     loadAgain();
     setAllocations(state, meter, entries);
 }
@@ -82,7 +82,7 @@ void measureSave(benchmark::State& state, Save<TableOf> save, Load<TableOf> load
         out.seekp(0);
         save(table, out);
     }
-    const bench::AllocationMeter meter;
+    const pells_test::AllocationMeter meter;
     out.seekp(0);
     save(table, out);
     setAllocations(state, meter, entries);

@@ -8,11 +8,11 @@
 #include <sstream>
 #include <stdexcept>
 
-#include "bench/support/allocations.h"
 #include "bench/support/bench.h"
 #include "bench/xml/documents.h"
 #include "bench/xml/peers.h"
 #include "pells/asset/pell_archive.h"
+#include "tests/support/allocations.h"
 #include "tools/archive_writer.h"
 
 namespace {
@@ -135,7 +135,7 @@ void measure(benchmark::State& state, Source& source, Tokenize tokenize, std::in
 
 /// The most memory that reading takes at a time, the longest token's included.
 double peakBytes(Source& source) {
-    const bench::AllocationMeter meter;
+    const pells_test::AllocationMeter meter;
     Receiver receiver;
     bench::tokensOfPells(source.start(), receiver);
     return static_cast<double>(meter.peakBytes());
