@@ -128,6 +128,18 @@ TEST(Factories, CreateByNameForTheirOwnBaseUntilOneOfTheNameDies) {
     EXPECT_EQ(ShapeFactory::classNameOf(typeid(Circle).name()), undeclared);
 }
 
+struct CircleAndToolFactory : Factory<Shape, Circle>, Factory<Tool, Tool> {
+    CircleAndToolFactory() : Factory<Shape, Circle>("circle"), Factory<Tool, Tool>("tool") {}
+};
+
+TEST(Factories, OfSeveralBasesAnswerUnderAnyOfTheirNames) {
+    const CircleAndToolFactory factory;
+    for (const char* const name : {"circle", "tool"}) {
+        EXPECT_TRUE(std::unique_ptr<Shape>(AbstractFactory<Shape>::createByName(name))) << name;
+        EXPECT_TRUE(std::unique_ptr<Tool>(AbstractFactory<Tool>::createByName(name))) << name;
+    }
+}
+
 struct Counted : smart_base {
     ~Counted() override { ++destroyed; }
     static int destroyed;

@@ -1,6 +1,8 @@
 #include "pells/timing/performance.h"
 
+#include <chrono>
 #include <regex>
+#include <thread>
 
 #include "pells/core/factory.h"
 #include "pells/platform/counter.h"
@@ -26,6 +28,29 @@ TEST(PerformanceCategories, ChargeOnlyTheInnermost) {
     EXPECT_EQ(PerformanceCategory::pop(0x51u), 0x30u);
     EXPECT_EQ(b.total(), 0x31u);
     EXPECT_EQ(a.stop(0x61u), 0x10u);
+}
+
+TEST(Counter, KeepsPaceWithTheSystemsClock) {
+    using std::chrono::steady_clock;
+    const auto microseconds = [](steady_clock::duration span) {
+        return std::chrono::duration_cast<std::chrono::microseconds>(span).count();
+    };
+    const steady_clock::time_point begin = steady_clock::now();
+    const std::uint64_t first = pells::platform::counter();
+    const std::int64_t slack = 3000;
+    std::uint64_t last = first;
+    for (int i = 0; i < 100000; ++i) {
+        // Bursts of readings with pauses of different lengths between them.
+        if (i % 10000 == 0)
+            std::this_thread::sleep_for(std::chrono::microseconds(300 * i / 10000));
+        const std::int64_t least = microseconds(steady_clock::now() - begin);
+        const std::uint64_t now = pells::platform::counter();
+        const std::int64_t most = microseconds(steady_clock::now() - begin);
+        ASSERT_GE(now, last);
+        last = now;
+        ASSERT_GE(static_cast<std::int64_t>(now - first), least - slack);
+        ASSERT_LE(static_cast<std::int64_t>(now - first), most + slack);
+    }
 }
 
 class ProbeTest : public pells_test::LibraryTest {};

@@ -64,8 +64,9 @@ private:
     static To* ownerOf(From* obj) {
         if (!obj)
             throw std::bad_cast();
-        // A dynamic cast searches the bases; most objects are just of the class.
-        if (typeid(*obj) == typeid(To))
+        // A dynamic cast searches the bases; most objects are just of the class. One whose class
+        // has its type information in another library, too, may go the long way.
+        if (&typeid(*obj) == &typeid(To))
             return static_cast<To*>(wholeOf(obj));
         return &dynamic_cast<To&>(*obj);
     }

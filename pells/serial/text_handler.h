@@ -2,11 +2,11 @@
 
 #include <boost/smart_ptr/intrusive_ptr.hpp>
 #include <string>
+#include <string_view>
 
 #include "pells/core/export.h"
-#include "pells/serial/accessor.h"
 #include "pells/serial/class_desc.h"
-#include "pells/serial/simple_field.h"
+#include "pells/serial/field.h"
 #include "pells/serial/text_form.h"
 #include "pells/serial/type_handler.h"
 #include "pells/xml/tag.h"
@@ -42,6 +42,23 @@ public:
         void save(const T& value, OutTag& tag) override;
         void load(T& value, InTag& tag) override;
     };
+
+private:
+    class TextField;
+};
+
+/// Lets a TextReader read each piece of text into a variable. A SimpleField would need an accessor
+/// for that, and most elements are texts.
+template <class T>
+class PELLS_TEMPLATE_API TextTypeHandler<T>::TextField : public Field {
+public:
+    /// \param place not owned; outlives the field.
+    explicit TextField(T* place) : Field(std::string_view()), variable(place) {}
+
+    void load(Serializable* /*obj*/, InTag& tag) override { TextReader().load(*variable, tag); }
+
+private:
+    T* variable;
 };
 
 template <class T>
@@ -53,8 +70,7 @@ void TextTypeHandler<T>::save(const T& value, OutTag& tag) {
 
 template <class T>
 void TextTypeHandler<T>::load(T& value, InTag& tag) {
-    const ClassDesc text(new SimpleField<T>("", new VariableAccessor<T>(&value),
-                                            detail::sharedHandler<TextReader>()));
+    const ClassDesc text(new TextField(&value));
     tag.parseContents(nullptr, text);
 }
 

@@ -63,6 +63,11 @@ struct EndOfComment {
 
 struct EndOfSpace {
     bool operator()(char c) const { return !isOf(CLASS_SPACE, c); }
+#ifdef PELLS_SCAN_SSE2
+    __m128i operator()(__m128i bytes) const {
+        return _mm_cmpeq_epi8(spaces(bytes), _mm_setzero_si128());
+    }
+#endif
 };
 
 struct EndOfName {
@@ -90,12 +95,16 @@ const char* scan(const char* next, const char* limit, End isEnd) {
     return scanShort(next, limit, isEnd);
 }
 
-// These runs are short and alike, so that guessing their ends is quicker than computing them.
-
-inline const char* scan(const char* next, const char* limit, EndOfSpace isEnd) {
-    return scanShort(next, limit, isEnd);
+/// White space is nothing, one character between attributes, or the indentation of a line.
+inline const char* scanSpace(const char* next, const char* limit) {
+    const EndOfSpace isEnd;
+    if (next == limit || isEnd(*next))
+        return next;
+    ++next;
+    return next == limit || isEnd(*next) ? next : scan(next, limit, isEnd);
 }
 
+/// Names are short and alike, so that guessing their ends is quicker than computing them.
 inline const char* scan(const char* next, const char* limit, EndOfName isEnd) {
     return scanShort(next, limit, isEnd);
 }

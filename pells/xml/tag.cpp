@@ -7,6 +7,7 @@
 
 #include "pells/core/no_destructor.h"
 #include "pells/serial/serializable.h"
+#include "pells/xml/scan.h"
 
 namespace pells {
 
@@ -178,14 +179,12 @@ public:
     }
 
     Line& appendEscaped(const std::string& text) {
+        const EndOfValue isSpecial{'"'};
         const char* done = text.data();
         const char* const end = done + text.size();
-        for (const char* at = done; at != end; ++at) {
-            if (*at != '<' && *at != '&' && *at != '"')
-                continue;
+        for (const char* at; (at = scan(done, end, isSpecial)) != end; done = at + 1) {
             append(done, static_cast<std::size_t>(at - done));
             *at == '<' ? append("&lt;") : *at == '&' ? append("&amp;") : append("&quot;");
-            done = at + 1;
         }
         return append(done, static_cast<std::size_t>(end - done));
     }

@@ -68,6 +68,7 @@ public:
     Token next() override;
 
 private:
+    [[gnu::noinline]] void readInPieces(Token& token, bool ready);
     bool readToken(Token& token);
     bool readMarkup(Token& token);
     bool readElement(Token& token);
@@ -113,11 +114,20 @@ Token XMLParser::next() {
     const char* const behind = ready ? plain.read(window.next, window.limit) : nullptr;
     // Made where the caller wants it, as moving tokens takes as long as reading short ones.
     Token token{plain.type(), plain.value(), {}};
-    if (behind) {
-        plain.getAttributes(token.attrs);
-        window.next = behind;
+    if (!behind) {
+        readInPieces(token, ready);
+        return token;
     }
-    const bool found = behind || (ready && readToken(token));
+    plain.getAttributes(token.attrs);
+    window.next = behind;
+    window.release();
+    ended = false;
+    return token;
+}
+
+/// Reads a token that is not plain, or not all at hand.
+void XMLParser::readInPieces(Token& token, bool ready) {
+    const bool found = ready && readToken(token);
     if (ready)
         window.release();
     ended = !found || lastText;
@@ -125,7 +135,6 @@ Token XMLParser::next() {
         token = Token();
         token.type = Token::T_EOF;
     }
-    return token;
 }
 
 bool XMLParser::readToken(Token& token) {
@@ -355,7 +364,7 @@ void XMLParser::take(Text& into, End isEnd) {
 
 /// Turns into the next token where that is to stay, which saves moving it there.
 struct NextToken {
-    XMLTokenizer::XMLParserMixin& parser;
+    XMLParser& parser;
     operator Token() const { return parser.next(); }  // NOLINT(google-explicit-constructor)
 };
 
@@ -372,7 +381,7 @@ XMLTokenizer::~XMLTokenizer() = default;
 
 XMLTokenizer::Token XMLTokenizer::getToken() {
     const bool held = pending.has_value();
-    Token token = held ? std::move(*pending) : parser->next();
+    Token token = held ? std::move(*pending) : static_cast<XMLParser&>(*parser).next();
     if (held)
         pending.reset();
     else if (token.type == Token::T_TEXT)
@@ -381,7 +390,7 @@ XMLTokenizer::Token XMLTokenizer::getToken() {
 }
 
 void XMLTokenizer::completeText(Token& text) {
-    const NextToken next{*parser};
+    const NextToken next{static_cast<XMLParser&>(*parser)};
     pending.emplace(next);
     while (pending->type == Token::T_TEXT) {
         text.value += pending->value;

@@ -11,8 +11,6 @@ using pells::XMLTokenizer;
 
 namespace {
 
-typedef const unsigned char* Position;
-typedef classic::rule<classic::scanner<Position>> Rule;
 typedef classic::chset<unsigned char> CharSet;
 typedef XMLTokenizer::Token Token;
 
@@ -22,7 +20,10 @@ class Action {
 public:
     explicit Action(Function f) : function(f) {}
     void operator()(unsigned char c) const { function(std::string(1, static_cast<char>(c))); }
-    void operator()(Position first, Position last) const { function(std::string(first, last)); }
+    template <class Position>
+    void operator()(const Position& first, const Position& last) const {
+        function(std::string(first, last));
+    }
 
 private:
     Function function;
@@ -50,13 +51,19 @@ char numberedEntity(const std::string& digits, int base) {
 }  // namespace
 
 /// "!" means optional in this parser library.
+template <class Position>
 class ReferenceTokenizer::Grammar {
 public:
     Grammar();
-    void start() { name = attributeName = attributeValue = std::string(); }
-    Token next(Position& position, Position end);
+
+    /// The tokens from a position to the end; the last one is T_EOF.
+    std::vector<Token> tokens(Position position, const Position& end);
 
 private:
+    typedef classic::rule<classic::scanner<Position>> Rule;
+
+    Token next(Position& position, const Position& end);
+
     void defineValues();
     void defineMarkup();
     void defineIgnorable();
@@ -99,14 +106,16 @@ private:
     Rule versionInfo, encodingDecl, standaloneDecl, declaration, ignorable, markup, any;
 };
 
-ReferenceTokenizer::Grammar::Grammar() {
+template <class Position>
+ReferenceTokenizer::Grammar<Position>::Grammar() {
     defineValues();
     defineMarkup();
     defineIgnorable();
     any = ignorable | markup;
 }
 
-void ReferenceTokenizer::Grammar::defineValues() {
+template <class Position>
+void ReferenceTokenizer::Grammar<Position>::defineValues() {
     using namespace classic;
     const CharSet nameStart("A-Za-z_-");  // a "-" at the end stands for itself
     const CharSet nameChar("A-Za-z0-9_-");
@@ -136,7 +145,8 @@ void ReferenceTokenizer::Grammar::defineValues() {
          '\'');
 }
 
-void ReferenceTokenizer::Grammar::defineMarkup() {
+template <class Position>
+void ReferenceTokenizer::Grammar<Position>::defineMarkup() {
     using namespace classic;
     const CharSet textChar(~CharSet("<&"));
 
@@ -151,7 +161,8 @@ void ReferenceTokenizer::Grammar::defineMarkup() {
              emptyTag[setToken(Token::T_SINGLE)] | charData[setToken(Token::T_TEXT)];
 }
 
-void ReferenceTokenizer::Grammar::defineIgnorable() {
+template <class Position>
+void ReferenceTokenizer::Grammar<Position>::defineIgnorable() {
     using namespace classic;
     const CharSet commentChar(CharSet("\t\n\r ") | range<unsigned char>(0x21, 0xFF));
 
@@ -165,7 +176,8 @@ void ReferenceTokenizer::Grammar::defineIgnorable() {
     ignorable = declaration | misc;
 }
 
-Token ReferenceTokenizer::Grammar::next(Position& position, Position end) {
+template <class Position>
+Token ReferenceTokenizer::Grammar<Position>::next(Position& position, const Position& end) {
     do {
         token = Token();
         const classic::parse_info<Position> result = classic::parse(position, end, any);
@@ -180,25 +192,38 @@ Token ReferenceTokenizer::Grammar::next(Position& position, Position end) {
     return token;
 }
 
-ReferenceTokenizer::ReferenceTokenizer() : grammar(std::make_unique<Grammar>()) {}
+template <class Position>
+std::vector<Token> ReferenceTokenizer::Grammar<Position>::tokens(Position position,
+                                                                 const Position& end) {
+    name = attributeName = attributeValue = std::string();
+    std::vector<Token> found;
+    do {
+        Token read = next(position, end);
+        const bool continues =
+            read.type == Token::T_TEXT && !found.empty() && found.back().type == Token::T_TEXT;
+        if (continues)
+            found.back().value += read.value;
+        else
+            found.push_back(std::move(read));
+    } while (found.back().type != Token::T_EOF);
+    return found;
+}
+
+ReferenceTokenizer::ReferenceTokenizer()
+    : inMemory(std::make_unique<Grammar<InMemory>>()),
+      inStream(std::make_unique<Grammar<InStream>>()) {}
 
 ReferenceTokenizer::~ReferenceTokenizer() = default;
 
 std::vector<Token> ReferenceTokenizer::tokens(const std::string& text) {
-    Position position = reinterpret_cast<Position>(text.data());
-    const Position end = position + text.size();
-    std::vector<Token> found;
-    grammar->start();
-    do {
-        Token token = grammar->next(position, end);
-        const bool continues =
-            token.type == Token::T_TEXT && !found.empty() && found.back().type == Token::T_TEXT;
-        if (continues)
-            found.back().value += token.value;
-        else
-            found.push_back(std::move(token));
-    } while (found.back().type != Token::T_EOF);
-    return found;
+    const InMemory first = reinterpret_cast<InMemory>(text.data());
+    return inMemory->tokens(first, first + text.size());
+}
+
+std::vector<Token> ReferenceTokenizer::tokens(std::istream& in) {
+    in.unsetf(std::ios_base::skipws);
+    const std::istream_iterator<unsigned char> first(in);
+    return inStream->tokens(InStream(first), InStream(std::istream_iterator<unsigned char>()));
 }
 
 }  // namespace pells_test

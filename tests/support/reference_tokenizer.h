@@ -1,5 +1,8 @@
 #pragma once
 
+#include <boost/spirit/include/classic_multi_pass.hpp>
+#include <istream>
+#include <iterator>
 #include <memory>
 #include <string>
 #include <vector>
@@ -18,9 +21,18 @@ public:
     /// The tokens of a text; the last one is T_EOF.
     std::vector<pells::XMLTokenizer::Token> tokens(const std::string& text);
 
+    /// The tokens of a stream, read character by character with as much memory as the longest one.
+    std::vector<pells::XMLTokenizer::Token> tokens(std::istream& in);
+
 private:
+    template <class Position>
     class Grammar;
-    std::unique_ptr<Grammar> grammar;
+
+    typedef const unsigned char* InMemory;
+    typedef boost::spirit::classic::multi_pass<std::istream_iterator<unsigned char>> InStream;
+
+    std::unique_ptr<Grammar<InMemory>> inMemory;
+    std::unique_ptr<Grammar<InStream>> inStream;
 };
 
 }  // namespace pells_test
