@@ -62,7 +62,11 @@ public:
             place =
                 std::next(directory.insert_or_assign(place, std::move(entry.first), entry.second));
         }
+        entries.clear();
+        order.clear();
     }
+
+    std::size_t size() const { return entries.size(); }
 
 private:
     /// A place among the entries, with a piece of the name there.
@@ -113,7 +117,6 @@ public:
         : stream(archiveStream), next(block), end(block) {}
 
     void readInto(Directory& directory) {
-        Stragglers stragglers;
         int c = get();
         while (c != endOfFile && c != endMark) {
             c = readEntry(c);
@@ -122,12 +125,20 @@ public:
             if (directory.empty() || directory.rbegin()->first < name)
                 directory.emplace_hint(directory.end(), std::move(name), entry);
             else
-                stragglers.add(std::move(name), entry);
+                addStraggler(directory, entry);
         }
         stragglers.moveInto(directory);
     }
 
 private:
+    void addStraggler(Directory& directory, const Entry& entry) {
+        const std::size_t fewEntries = 1024;
+        stragglers.add(std::move(name), entry);
+        // They may be a few names over and over again.
+        if (stragglers.size() > std::max(directory.size(), fewEntries))
+            stragglers.moveInto(directory);
+    }
+
     /// Reads the entry that begins with c, and one character more, which it returns.
     int readEntry(int c) {
         offsetText.clear();
@@ -217,6 +228,7 @@ private:
     }
 
     std::istream& stream;
+    Stragglers stragglers;
     const char* next;
     const char* end;
     std::string offsetText;
