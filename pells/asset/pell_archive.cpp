@@ -31,6 +31,14 @@ const std::uint32_t largeWindow = 256 * 1024;
 /// the data repeats bytes of an earlier call; with pieces of 4 KB a quarter of the time goes there.
 const long largeBlock = 256 * 1024;
 
+/// The same for one who takes small pieces but has taken more than a glance.
+const long smallBlock = 32 * 1024;
+const uLong glance = 4096;
+
+bool isFailure(int zlibResult) {
+    return zlibResult != Z_OK && zlibResult != Z_STREAM_END;
+}
+
 const Version& currentVersion() {
     static const Version version("1.0");
     return version;
@@ -99,7 +107,8 @@ basic_pellibuf<C, Traits>::basic_pellibuf(const std::string& path)
       aheadCount(0),
       nextInflated(nullptr),
       inflatedCount(0),
-      inflatedResult(Z_OK) {
+      selected{},
+      careful(false) {
     static_assert(sizeof(C) == 1 && sizeof inputBuffer == blockSize, "members are bytes");
     if (stream->fail())
         throw BadPellFile("Can't open pell file");
@@ -171,14 +180,21 @@ void basic_pellibuf<C, Traits>::open(const Directory::value_type& entry) {
 
 template <class C, class Traits>
 void basic_pellibuf<C, Traits>::select(const Entry& entry) {
-    stream->clear();
-    stream->seekg(entry.offset);
-    remaining = entry.length;
-    aheadCount = 0;
-    inflatedCount = 0;
-    inflatedResult = Z_OK;
+    selected = entry;
     C* const start = this->buffer();
     this->setg(start, start, start);
+    careful = false;
+    restart();
+}
+
+/// Begins to inflate the selected member anew.
+template <class C, class Traits>
+void basic_pellibuf<C, Traits>::restart() {
+    stream->clear();
+    stream->seekg(selected.offset);
+    remaining = selected.length;
+    aheadCount = 0;
+    inflatedCount = 0;
     inflateReset(&inflater);
     inflater.next_in = nullptr;
     inflater.avail_in = 0;
@@ -190,16 +206,11 @@ long basic_pellibuf<C, Traits>::read(C* into, long room) {
         return 0;
     if (inflatedCount == 0)
         inflateAhead(room);
-    // A piece that reaches a damaged place is not served, as if it had been inflated by itself.
-    const bool damaged =
-        inflatedResult != Z_OK && inflatedResult != Z_STREAM_END && room >= inflatedCount;
-    if (inflatedCount != 0 && !damaged)
+    if (inflatedCount != 0)
         return takeInflated(into, room);
-    int result = inflatedResult;
-    inflatedCount = 0;
-    inflatedResult = Z_OK;
-    const long count = damaged ? 0 : inflateSome(into, room, result);
-    if (result != Z_STREAM_END && result != Z_OK) {
+    int result = Z_OK;
+    const long count = inflateSome(into, room, result);
+    if (isFailure(result)) {
         inflater.check("read(): bad pell data stream for member '" + memberName + "'", result,
                        Z_STREAM_END, Z_OK);
     }
@@ -230,15 +241,40 @@ template <class C, class Traits>
 void basic_pellibuf<C, Traits>::inflateAhead(long room) {
     const std::uint64_t rest = std::uint64_t{remaining} + aheadCount + inflater.avail_in;
     const std::uint64_t severalReads = 4 * static_cast<std::uint64_t>(room);
-    if (room <= this->bufferSize() || room >= largeBlock || rest < severalReads)
+    const bool small = room <= this->bufferSize();
+    // Who takes small pieces may want no more than a look at the first bytes.
+    const bool mayStop = small && inflater.total_out < glance;
+    if (careful || mayStop || room >= largeBlock || rest < severalReads)
         return;
-    const long size = static_cast<long>(std::min<std::uint64_t>(4 * rest, largeBlock));
+    const uLong position = inflater.total_out;
+    const long size =
+        static_cast<long>(std::min<std::uint64_t>(4 * rest, small ? smallBlock : largeBlock));
     if (inflated.size() < static_cast<std::size_t>(size))
         inflated.resize(static_cast<std::size_t>(size));
     int result = Z_OK;
     inflatedCount = inflateSome(inflated.data(), size, result);
-    inflatedResult = result;
     nextInflated = inflated.data();
+    if (isFailure(result))
+        returnTo(position, room);
+}
+
+/// Goes back to a place in a damaged member, in pieces as the reader asks for them, and inflates
+/// nothing ahead any more: the pieces before the damaged one are served as if nothing had been.
+template <class C, class Traits>
+void basic_pellibuf<C, Traits>::returnTo(uLong position, long room) {
+    restart();
+    careful = true;
+    int result = Z_OK;
+    long count = 1;
+    while (inflater.total_out < position && count != 0 && !isFailure(result)) {
+        // Before the first piece there is no character that could be put back.
+        const long piece = inflater.total_out == 0 ? std::max(room, this->bufferSize()) : room;
+        count = inflateSome(inflated.data(), piece, result);
+    }
+    if (inflater.total_out > position && !isFailure(result)) {
+        inflatedCount = static_cast<long>(inflater.total_out - position);
+        nextInflated = inflated.data() + (count - inflatedCount);
+    }
 }
 
 template <class C, class Traits>

@@ -118,8 +118,10 @@ protected:
 private:
     void readHeader();
     void select(const Entry& entry);
+    void restart();
     long inflateSome(C* into, long room, int& result);
     void inflateAhead(long room);
+    void returnTo(uLong position, long room);
     long takeInflated(C* into, long room);
     bool refill(bool wide);
     void fetch(bool wide);
@@ -131,11 +133,13 @@ private:
     const char* ahead;
     std::uint32_t aheadCount;
 
-    /// Bytes that were inflated ahead, and what zlib said when it had made the last of them.
+    /// Bytes that were inflated ahead.
     std::vector<C> inflated;
     const C* nextInflated;
     long inflatedCount;
-    int inflatedResult;
+
+    Entry selected;
+    bool careful;  ///< the member is damaged
 };
 
 extern template class PELLS_API basic_pellibuf<char>;
