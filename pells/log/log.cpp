@@ -5,6 +5,7 @@
 #include <sstream>
 #include <vector>
 
+#include "pells/core/no_destructor.h"
 #include "pells/core/prefs.h"
 #include "pells/core/strings.h"
 #include "pells/log/exit_hooks.h"

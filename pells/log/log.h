@@ -5,11 +5,11 @@
 #include <ios>
 #include <list>
 #include <map>
+#include <new>
 #include <ostream>
 #include <string>
 #include <utility>
 
-#include "pells/core/no_destructor.h"
 #include "pells/core/singleton.h"
 #include "pells/log/stream_buffers.h"
 
@@ -94,8 +94,8 @@ private:
 
 /// The tag of one logging site and whether it is on, decided once.
 ///
-/// A site keeps a static key, so that a disabled site costs one test of a bool and builds no text;
-/// PELLS_LOG does all of it. The verdict outlives the log it came from. One thread only.
+/// A site keeps its key for good, so that nothing is looked up and no text is built while its tag
+/// is off; PELLS_LOG does all of it. The verdict outlives the log it came from. One thread only.
 class PELLS_API LogKey {
 public:
     /// Registers the tag with the log, which is created if there is none.
@@ -139,6 +139,30 @@ private:
     Log::TagState* state = nullptr;
 };
 
+/// Where a logging site keeps its key, which its first run makes; never destroyed.
+///
+/// A static one needs no initialization, so that a site that is off costs the test of one byte.
+class LogSite {
+public:
+    /// Whether the tag turned out to be off.
+    bool isOff() const { return verdict == OFF; }
+
+    /// The site's key, or null when its tag is off. Throws what LogKey throws; then the next call
+    /// tries again.
+    template <class Tag>
+    const LogKey* keyIfOn(const Tag& tag) {
+        if (verdict == UNDECIDED)
+            verdict = (::new (static_cast<void*>(storage)) LogKey(tag))->isEnabled() ? ON : OFF;
+        return verdict == ON ? std::launder(reinterpret_cast<const LogKey*>(storage)) : nullptr;
+    }
+
+private:
+    enum Verdict : unsigned char { UNDECIDED, OFF, ON };
+
+    Verdict verdict = UNDECIDED;
+    alignas(LogKey) unsigned char storage[sizeof(LogKey)] = {};
+};
+
 /// Writes one line if the tag is on: the tag, ": ", the message and a line feed.
 ///
 ///     PELLS_LOG("app.load", "read " << count << " parts of " << name);
@@ -146,13 +170,15 @@ private:
 /// The message is evaluated only when the tag is on. Format flags that it sets stay set on the
 /// log's stream, so it undoes them. The site's key is never destroyed: sites in destructors of
 /// static objects work to the end.
-#define PELLS_LOG(tag, message)                                                  \
-    do {                                                                         \
-        static const ::pells::NoDestructor<::pells::LogKey> pellsLogKey{tag};    \
-        if (pellsLogKey->isEnabled()) {                                          \
-            ::pells::Log::instance().beginLine(*pellsLogKey) << message << '\n'; \
-            ::pells::Log::instance().flush();                                    \
-        }                                                                        \
+#define PELLS_LOG(tag, message)                                                         \
+    do {                                                                                \
+        static ::pells::LogSite pellsLogSite;                                           \
+        if (!pellsLogSite.isOff()) {                                                    \
+            if (const ::pells::LogKey* const pellsLogKey = pellsLogSite.keyIfOn(tag)) { \
+                ::pells::Log::instance().beginLine(*pellsLogKey) << message << '\n';    \
+                ::pells::Log::instance().flush();                                       \
+            }                                                                           \
+        }                                                                               \
     } while (false)
 
 }  // namespace pells
