@@ -3,6 +3,7 @@
 #include <dlfcn.h>
 #include <gtest/gtest.h>
 #include <link.h>
+#include <malloc.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -123,6 +124,21 @@ TEST_F(UnloadTest, SaysTheSameWhenTheProcessExits) {
     waitpid(child, &status, 0);
     EXPECT_EQ(status, 0);
     expectFarewell();
+}
+
+TEST_F(UnloadTest, KeepsNoMemoryOnceTheSingletonsAreFreed) {
+    const auto bytesAfter = [](int rounds) {
+        for (int round = 0; round < rounds; ++round) {
+            const Plugin plugin(PLUGIN_A);
+            plugin->setRules("app");
+            plugin->log("at work");
+            plugin->freeSingletons();
+        }
+        return static_cast<long>(mallinfo2().uordblks);
+    };
+    // The dynamic linker itself takes some memory at first.
+    const long before = bytesAfter(5);
+    EXPECT_LT(bytesAfter(20) - before, 1000);
 }
 
 TEST_F(UnloadTest, LeavesTwoPluginsOneOfEverything) {
