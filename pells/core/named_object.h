@@ -3,6 +3,7 @@
 #include <boost/iterator/transform_iterator.hpp>
 #include <exception>
 #include <map>
+#include <new>
 #include <string>
 #include <vector>
 
@@ -79,6 +80,8 @@ private:
     static P _unregister(const std::string& name);
 
     static Registry* _reg;
+    // Here rather than on the heap, where it would stay behind when the library is unloaded.
+    alignas(Registry) static unsigned char _storage[sizeof(Registry)];
 
     bool registered = false;
     std::string name;
@@ -101,6 +104,10 @@ protected:
 
 template <class T, class P>
 typename NamedObject<T, P>::Registry* NamedObject<T, P>::_reg = nullptr;
+
+template <class T, class P>
+alignas(typename NamedObject<T, P>::Registry) unsigned char NamedObject<T, P>::_storage[sizeof(
+    typename NamedObject<T, P>::Registry)];
 
 template <class T, class P>
 NamedObject<T, P>::NamedObject(const std::string& objectName) : name(objectName) {
@@ -166,7 +173,7 @@ typename NamedObject<T, P>::const_iterator NamedObject<T, P>::end() {
 template <class T, class P>
 typename NamedObject<T, P>::Registry& NamedObject<T, P>::_registry() {
     if (!_reg)
-        _reg = new Registry;
+        _reg = ::new (static_cast<void*>(_storage)) Registry;
     return *_reg;
 }
 

@@ -8,6 +8,8 @@
 #include <ios>
 #include <limits>
 
+#include "pells/core/no_destructor.h"
+
 namespace pells {
 
 namespace {
@@ -76,6 +78,9 @@ char* write(const SixDigits& number, char* to) {
 
 /// Writes plain numbers itself and leaves the others to its base.
 class FastNumPut : public std::num_put<char> {
+public:
+    using std::num_put<char>::num_put;
+
 protected:
     iter_type do_put(iter_type out, std::ios_base& stream, char fill, long value) const override {
         return putInteger(out, stream, fill, value);
@@ -124,7 +129,10 @@ FastNumPut::iter_type FastNumPut::do_put(iter_type out, std::ios_base& stream, c
 }  // namespace
 
 std::locale fastClassicLocale() {
-    return std::locale(std::locale::classic(), new FastNumPut);
+    // Not the locale's: one that cannot be made for lack of memory would not delete the facet.
+    static const std::size_t keptForever = 1;
+    static NoDestructor<FastNumPut> facet(keptForever);
+    return std::locale(std::locale::classic(), &*facet);
 }
 
 }  // namespace pells
