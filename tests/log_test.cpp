@@ -31,7 +31,7 @@ public:
 };
 
 bool isOn(const std::string& tag) {
-    return Log::instance().isEnabled(tag.c_str(), false);
+    return Log::instance().isEnabled(tag, false);
 }
 
 TEST_F(LogTest, DecidesByTheLastPrefixThatFits) {

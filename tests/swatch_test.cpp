@@ -32,7 +32,8 @@ Material black() {
 }
 
 std::uint32_t at(const Thumbnail& sphere, int x, int y) {
-    return sphere.pixels.at(static_cast<std::size_t>(y * sphere.width + x));
+    const auto columns = static_cast<std::size_t>(sphere.width);
+    return sphere.pixels.at(static_cast<std::size_t>(y) * columns + static_cast<std::size_t>(x));
 }
 
 std::uint32_t middle(const Material& material) {

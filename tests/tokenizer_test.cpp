@@ -52,8 +52,9 @@ TEST(Tokenizer, ReadsTextWithReferencesBetweenTags) {
                                 {"&#99999999999999999999999999;&#x10000000000000000;", "\xFF\xFF"},
                                 {"\xC3\xA4\x01\x7F]]>", "\xC3\xA4\x01\x7F]]>"}};
     for (const Example& each : examples) {
-        EXPECT_EQ(tokensOf("<t\n>" + each.first + "</t >"),
-                  openT + "Token: 4 (T_TEXT) \"" + each.second + "\"\n" + closeT);
+        std::string expected = openT;
+        expected.append("Token: 4 (T_TEXT) \"").append(each.second).append("\"\n");
+        EXPECT_EQ(tokensOf("<t\n>" + each.first + "</t >"), expected + closeT);
     }
     EXPECT_EQ(tokensOf("<t> \t\r\n</t>"), openT + closeT);
     EXPECT_EQ(tokensOf("<t>ab&amp;&c</t>"), openT + "Token: 4 (T_TEXT) \"ab&\"\n");

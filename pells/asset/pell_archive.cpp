@@ -29,10 +29,10 @@ const std::uint32_t largeWindow = 256 * 1024;
 
 /// What is inflated at a time for one who asks for much, but less than this. zlib is slow wherever
 /// the data repeats bytes of an earlier call; with pieces of 4 KB a quarter of the time goes there.
-const long largeBlock = 256 * 1024;
+const long largeBlock = 256L * 1024;
 
 /// The same for one who takes small pieces but has taken more than a glance.
-const long smallBlock = 32 * 1024;
+const long smallBlock = 32L * 1024;
 const uLong glance = 4096;
 
 bool isFailure(int zlibResult) {
