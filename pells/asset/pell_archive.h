@@ -180,7 +180,9 @@ public:
     /// read before the first read; memory does not depend on the member's size.
     bool open(const std::string& member);
 
-    /// The same for an entry of getDirectory(), without looking for its name.
+    /// The same without looking for the name.
+    ///
+    /// \param entry of this archive's getDirectory().
     void open(const typename Directory::value_type& entry);
 
     /// The member names in ascending order.
