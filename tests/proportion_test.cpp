@@ -4,6 +4,7 @@
 
 #include <sstream>
 
+#include "pells/asset/asset_manager.h"
 #include "pells/asset/pell_archive.h"
 #include "pells/image/image_base.h"
 #include "pells/image/image_loaders.h"
@@ -122,6 +123,25 @@ TEST_F(Proportion, OfMembersThatInflateAThousandfold) {
     const std::string bytes = pells_test::archiveOf({{"bomb", std::string(size, '\0')}});
     EXPECT_LT(bytes.size(), std::size_t(size / 900));
     EXPECT_LT(peakOfArchive(bytes, "bomb", size), 512 * KiB);
+}
+
+TEST_F(Proportion, OfAliasesThatDoubleWithEveryLevel) {
+    std::vector<std::pair<std::string, std::string>> members;
+    std::string folder;
+    for (int depth = 0; depth < 60; ++depth) {
+        members.emplace_back(folder + ".symlinks", "link>d\n");
+        folder += "d/";
+    }
+    members.emplace_back(folder + "x", "");
+    scratch.write("root/a.asset", pells_test::archiveOf(members));
+    pells_test::prefs() = {{"log", "error"}, {"assetLocation", "root"}};
+    for (const std::int64_t limit : {100, 10000}) {
+        pells::AssetManager::setAliasLimit(std::size_t(limit));
+        const AllocationMeter meter;
+        EXPECT_TRUE(pells::AssetManager::instance().isFile(folder + "x"));
+        EXPECT_LT(meter.peakBytes(), MiB + 700 * limit);
+        pells::SingletonList::freeSingletons();
+    }
 }
 
 TEST_F(Proportion, OfTokensWhateverIsSkipped) {
