@@ -9,10 +9,14 @@ namespace pells {
 /// A point in time, or a span, counted in microseconds in 64 unsigned bits.
 class PELLS_API Timestamp {
 public:
+    /// Zero.
+    Timestamp() = default;
+
     /// \param highHalf upper 32 bits of the count; one unit is 2^32 microseconds (71.6 minutes).
     /// \param lowHalf  lower 32 bits of the count.
-    explicit Timestamp(std::uint32_t highHalf = 0, std::uint32_t lowHalf = 0)
-        : high(highHalf), low(lowHalf) {}
+    Timestamp(std::uint32_t highHalf, std::uint32_t lowHalf) : high(highHalf), low(lowHalf) {}
+
+    explicit Timestamp(std::uint32_t highHalf) : high(highHalf) {}
 
     std::uint32_t getHigh() const { return high; }
     std::uint32_t getLow() const { return low; }
@@ -39,8 +43,8 @@ public:
     std::int32_t diffInMicrosec(const Timestamp& other) const;
 
 private:
-    std::uint32_t high;
-    std::uint32_t low;
+    std::uint32_t high = 0;
+    std::uint32_t low = 0;
 };
 
 }  // namespace pells

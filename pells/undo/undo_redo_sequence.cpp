@@ -135,6 +135,8 @@ void UndoRedoSequence::acceptLoadedSteps() {
     }
     if (!steps.empty())
         current = static_cast<int>(steps.size()) - 1;
+    else if (current > allUndone)
+        current = nothingHeld;
 }
 
 boost::intrusive_ptr<Field> UndoRedoSequence::getField(const std::string& name) {
