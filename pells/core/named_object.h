@@ -18,7 +18,8 @@ namespace pells {
 /// for byte. One thread only.
 ///
 /// \tparam T the family's class, derived from this one.
-/// \tparam P the pointer to T that look-ups give; it is made from a T*.
+/// \tparam P the pointer to T that look-ups give; it is made from a T*. The registry itself holds
+///           no reference, so a counted pointer only fits objects that somebody else keeps.
 ///
 /// When several shared objects use one family, its instance must be exported from one of them, as
 /// for RogueSingleton.

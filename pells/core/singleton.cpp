@@ -32,8 +32,9 @@ void SingletonList::_delSingleton(SingletonBase* singletonObject) {
 void SingletonList::_freeSingletons() {
     while (!singletons.empty()) {
         SingletonBase* const newest = singletons.back();
-        // Taken out first: an entry whose destructor does not remove it must not be met again.
-        singletons.pop_back();
+        // Taken out first: what its destructor does not remove, or was added twice, must not be met
+        // again.
+        _delSingleton(newest);
         newest->deleteSelf();
     }
     deleteSelf();

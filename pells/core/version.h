@@ -17,7 +17,7 @@ public:
     /// 0.0
     Version() = default;
     Version(std::int16_t majorNumber, std::int16_t minorNumber);
-    explicit Version(const Pair& numbers);
+    Version(const Pair& numbers);  // NOLINT(google-explicit-constructor): a pair is the value
 
     /// Reads "MAJOR.MINOR" or "MAJOR" (minor 0), in decimal.
     ///

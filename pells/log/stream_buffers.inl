@@ -90,7 +90,7 @@ typename Traits::int_type simple_ostreambuf<C, Traits>::overflow(typename Traits
 
 template <class C, class Traits>
 std::streamsize simple_ostreambuf<C, Traits>::xsputn(const C* text, std::streamsize count) {
-    if (count > this->epptr() - this->pptr())
+    if (count < 0 || count > this->epptr() - this->pptr())
         return std::basic_streambuf<C, Traits>::xsputn(text, count);
     Traits::copy(this->pptr(), text, static_cast<std::size_t>(count));
     this->pbump(static_cast<int>(count));
