@@ -67,7 +67,7 @@ struct AssetManager::DirNode {
 /// What a walk over the folders remembers: the folders that it is in, and how much more it may do.
 class AssetManager::FolderWalk {
 public:
-    FolderWalk() { chain.push_back(Folder{assetPath(""), true, false, false}); }
+    FolderWalk() { chain.push_back(Folder{assetPath(""), true, false, false, false}); }
 
     /// Goes into a child of the current folder; false when that is not to be searched.
     ///
@@ -80,11 +80,12 @@ public:
             return false;
         }
         const Folder& parent = chain.back();
-        Folder child = {parent.real / name, false, parent.behindLink, parent.linked || linked};
-        child.onDisk = parent.onDisk && isNativeName(name) && exists(child.real);
+        Folder child = {parent.real / name, false, parent.behindLink, parent.linked || linked,
+                        parent.outside || name == ".."};
+        child.onDisk = parent.onDisk && !child.outside && isNativeName(name) && exists(child.real);
         if (child.onDisk) {
             child.behindLink = child.behindLink || mayLeadBack(child.real, name);
-            child.onDisk = !child.behindLink || !isEntered(child.real);
+            child.onDisk = !child.behindLink || (!isEntered(child.real) && payForLinkedFolder());
         }
         if (!child.onDisk && !inArchives)
             return false;
@@ -96,6 +97,10 @@ public:
 
     /// Whether the real folder is to be listed, too.
     bool isOnDisk() const { return chain.back().onDisk; }
+
+    /// Whether the name of the current folder goes through "..", as only an archive's members can:
+    /// they must not make the walk read the folders around the root.
+    bool isOutside() const { return chain.back().outside; }
 
     /// Whether a link stands for the current folder or for one that it is in.
     bool isLinked() const { return chain.back().linked; }
@@ -115,6 +120,7 @@ private:
         bool onDisk;
         bool behindLink;
         bool linked;
+        bool outside;
     };
 
     static bool exists(const fs::path& path) {
@@ -126,7 +132,7 @@ private:
     /// archive has made up.
     static bool mayLeadBack(const fs::path& path, const std::string& name) {
         boost::system::error_code ignored;
-        return name.empty() || name == "." || name == ".." ||
+        return name.empty() || name == "." ||
                fs::symlink_status(path, ignored).type() != fs::directory_file;
     }
 
@@ -135,6 +141,18 @@ private:
             boost::system::error_code ignored;
             return folder.onDisk && fs::equivalent(folder.real, path, ignored);
         });
+    }
+
+    /// Links of the file system that cross may offer each folder under any number of names without
+    /// ever leading in a circle.
+    bool payForLinkedFolder() {
+        if (linkedFoldersLeft == 0)
+            return false;
+        --linkedFoldersLeft;
+        if (linkedFoldersLeft == 0)
+            PELLS_LOG("error",
+                      "Too many folders behind links of the file system to look for aliases");
+        return true;
     }
 
     void reportDepth(const std::string& path) {
@@ -169,6 +187,7 @@ private:
     const std::size_t limit = aliasLimit;
     std::uint64_t textLeft = inProportion(128);
     std::uint64_t namesLeft = inProportion(512);
+    std::uint64_t linkedFoldersLeft = limit / 50 + 1000;
     bool depthReported = false;
     bool excessReported = false;
 };
@@ -217,6 +236,8 @@ boost::shared_ptr<AssetManager::DirNode> AssetManager::buildDirTree(const std::s
 
 void AssetManager::readLinks(DirNode& node, FolderWalk& walk) {
     const std::string linkFile = node.pathOf(".symlinks");
+    if (walk.isOutside() && cache.count(linkFile) == 0)
+        return;
     const auto container = getFileStream(linkFile, false);
     if (!container)
         return;
