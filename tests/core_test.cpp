@@ -1,7 +1,6 @@
 #include <boost/lexical_cast.hpp>
 #include <sstream>
 
-#include "pells/core/class_name.h"
 #include "pells/core/factory.h"
 #include "pells/core/named_object.h"
 #include "pells/core/prefs.h"
@@ -70,33 +69,27 @@ TEST(NamedObjects, KeepTheFirstOfANameUntilOneOfThatNameDiesThatIsNotForgotten) 
     EXPECT_THROW(Part::find("n"), Part::NotFound);
 }
 
-struct Shape {
-    virtual ~Shape() = default;
-};
-struct Circle : Shape {};
-
-TEST(Factories, CreateByNameForTheirOwnBaseUntilOneOfTheNameDies) {
-    typedef AbstractFactory<Shape> ShapeFactory;
-    const std::string circle = typeid(Circle).name();
-    {
-        const Factory<Shape, Circle> factory("circle");
-        {
-            const Factory<Shape, Shape> second("circle");
-            const std::unique_ptr<Shape> made(ShapeFactory::createByName("circle"));
-            EXPECT_TRUE(dynamic_cast<Circle*>(made.get()));
-            EXPECT_EQ(AbstractFactory<Prefs>::createByName("circle"), nullptr);
-        }
-        EXPECT_EQ(ShapeFactory::createByName("circle"), nullptr);
-        EXPECT_EQ(ShapeFactory::classNameOf(circle), "circle");
-    }
-    EXPECT_EQ(
-        ShapeFactory::classNameOf(circle),
-        std::string("** No declared Factory<") + typeid(Shape).name() + ", " + circle + ">! **");
-}
-
 struct Counted : smart_base {
     ~Counted() override { deaths += 'c'; }
 };
+
+TEST(Factories, CreateByNameForTheirOwnBaseUntilOneOfTheNameDies) {
+    typedef AbstractFactory<smart_base> Factories;
+    const std::string type = typeid(Counted).name();
+    {
+        const Factory<smart_base, Counted> factory("counted");
+        {
+            const Factory<Prefs, pells_test::TestPrefs> second("counted");
+            const boost::intrusive_ptr<smart_base> made(Factories::createByName("counted"));
+            EXPECT_TRUE(dynamic_cast<Counted*>(made.get()));
+            EXPECT_EQ(AbstractFactory<Prefs>::createByName("counted"), nullptr);
+        }
+        EXPECT_EQ(Factories::createByName("counted"), nullptr);
+        EXPECT_EQ(Factories::classNameOf(type), "counted");
+    }
+    EXPECT_EQ(Factories::classNameOf(type), std::string("** No declared Factory<") +
+                                                typeid(smart_base).name() + ", " + type + ">! **");
+}
 
 TEST(SmartBase, DiesWithItsLastPointerAndCopiesStartUncounted) {
     deaths.clear();
@@ -149,12 +142,6 @@ TEST(Strings, HaveASingularThatFollowsTheLastLetters) {
     EXPECT_EQ(getSingularName("ies"), "y");
     EXPECT_EQ(getSingularName("s"), "");
     EXPECT_EQ(getSingularName(""), "Item");
-}
-
-TEST(ClassName, DropsTheLibrarysNamespaceOnly) {
-    EXPECT_EQ(className(typeid(Prefs)), "Prefs");
-    EXPECT_EQ(className(typeid(AbstractFactory<Prefs>)), "AbstractFactory<Prefs>");
-    EXPECT_EQ(className(typeid(pells_test::TestPrefs)), "pells_test::TestPrefs");
 }
 
 }  // namespace

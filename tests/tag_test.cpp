@@ -2,8 +2,9 @@
 
 #include <gtest/gtest.h>
 
-#include <list>
-#include <random>
+#include <sstream>
+#include <utility>
+#include <vector>
 
 namespace {
 
@@ -12,42 +13,23 @@ using pells::OutTag;
 
 typedef std::vector<std::pair<std::string, std::string>> Pairs;
 
-/// The order of the attributes by its definition: chains of a hash table, grown at the front.
-Pairs chained(const Pairs& added) {
-    std::size_t buckets = 193;
-    for (const std::size_t prime : {389u, 769u, 1543u, 3079u})
-        buckets = added.size() > buckets ? prime : buckets;
-    std::vector<std::list<Pairs::value_type>> table(buckets);
-    for (const auto& attr : added) {
-        std::uint32_t hash = 0;
-        for (const char c : attr.first)
-            hash = hash * 5 + static_cast<std::uint32_t>(static_cast<signed char>(c));
-        table[hash % buckets].push_front(attr);
-    }
-    Pairs visited;
-    for (const auto& chain : table)
-        visited.insert(visited.end(), chain.begin(), chain.end());
-    return visited;
-}
-
-TEST(Attributes, AreVisitedLikeTheChainsOfAHashTable) {
-    std::mt19937 random(20);
+TEST(Attributes, AreVisitedByTheRestOfTheirHashTheLastAddedFirst) {
     AttrMap attrs;
-    Pairs added;
-    for (const std::size_t count : {1u, 17u, 193u, 194u, 2000u}) {
-        while (added.size() < count) {
-            const std::string start(1, static_cast<char>(random()));
-            added.emplace_back(start + std::to_string(added.size()), "first");
-            attrs.set(added.back().first, "first");
-        }
-        added[0].second = std::to_string(count);
-        attrs.set(added[0].first, added[0].second);
-        EXPECT_EQ(Pairs(attrs.begin(), attrs.end()), chained(added)) << count;
-    }
+    for (const char* const name : {"x", "name", "\xE9", "Qe"})
+        attrs.set(name, "");
+    EXPECT_EQ(Pairs(attrs.begin(), attrs.end()),
+              (Pairs{{"name", ""}, {"\xE9", ""}, {"Qe", ""}, {"x", ""}}));
+    attrs.set("x", "new");
+    attrs.set("a", "");
+    EXPECT_EQ(Pairs(attrs.begin(), attrs.end()),
+              (Pairs{{"name", ""}, {"\xE9", ""}, {"a", ""}, {"Qe", ""}, {"x", "new"}}));
 }
 
 TEST(Attributes, OfATokenKeepTheLastOfEqualNames) {
-    for (const int names : {2, 150000}) {
+    const std::pair<int, const char*> firstVisited[] = {
+        {2, "n0"}, {193, "n95"}, {194, "n100"}, {150000, "n0"}};
+    for (const auto& each : firstVisited) {
+        const int names = each.first;
         Pairs list;
         for (int i = 0; i <= names; ++i)
             list.emplace_back("n" + std::to_string(i % names), std::to_string(i));
@@ -56,6 +38,7 @@ TEST(Attributes, OfATokenKeepTheLastOfEqualNames) {
         EXPECT_EQ(attrs.size(), static_cast<std::size_t>(names));
         EXPECT_EQ(*attrs.find("n0"), std::to_string(names));
         EXPECT_EQ(*attrs.find("n1"), "1");
+        EXPECT_EQ(attrs.begin()->first, each.second);
     }
 }
 
