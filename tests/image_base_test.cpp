@@ -23,7 +23,7 @@ public:
         format = pixelFormat;
         numComponents = pixelFormat == FMT_RGB ? 3 : 4;
         for (int i = 0; i < width * height * numComponents; ++i)
-            data[static_cast<std::size_t>(i)] = static_cast<unsigned char>(i * 89);
+            data[static_cast<std::size_t>(i)] = static_cast<unsigned char>(i * 89 + i / 251);
     }
     using Image_base::makeBogusImage;
 };
