@@ -67,7 +67,7 @@ TEST(Pixels, ArePackedWithTheLowBitsDropped) {
 TEST(Pixels, AreTheSameInWholeRows) {
     for (const ImageFormat format : {FMT_RGB, FMT_RGBA, ownFormat}) {
         // Blocks of several pixels leave rests of every length.
-        for (const std::size_t width : {0, 1, 2, 3, 4, 5, 6, 7, 8, 9, 17, 256, 257, 1030}) {
+        for (const std::size_t width : {0u, 1u, 2u, 3u, 4u, 5u, 7u, 8u, 9u, 17u, 257u, 1030u}) {
             const TestImage image(static_cast<int>(width), 2, format);
             std::vector<std::uint32_t> abgr(width), argb(width), a2b10(width);
             std::vector<std::uint16_t> a1r5(width), a4r4(width), a8r3(width);
