@@ -1,5 +1,4 @@
 #include <algorithm>
-#include <boost/filesystem/operations.hpp>
 
 #include "support/archive_bytes.h"
 #include "support/tga_file.h"
@@ -7,37 +6,26 @@
 
 namespace {
 
-namespace fs = boost::filesystem;
 using namespace pells_test;
 
-class ToolTest : public ToolRuns {
-protected:
-    /// The sample root below the current folder, with its archives and write times.
-    void prepareSamples() {
-        const Outcome outcome = shell(R"(set -e
-            cp -r ')" PELLS_SAMPLES R"(/root' assets
-            for name in textures maps patch; do
-                "$PELLS" pack -o assets/$name.asset ')" PELLS_SAMPLES R"('/archives/$name
-            done
-            for name in rose flag; do
-                "$PELLS" pack -o assets/Data/$name.pell ')" PELLS_SAMPLES R"('/pictures/$name
-            done
-            find assets -exec touch -d 2020-01-01 {} +
-            touch -d 2020-02-01 assets/maps.asset assets/textures.asset
-            touch -d 2020-03-01 assets/patch.asset
-            touch -d 2020-04-01 assets/Textures/marble.tga)");
-        ASSERT_EQ(outcome.status, 0) << outcome.err;
-    }
-};
+/// An entry of an image table, for a picture with one loader.
+std::string definition(const std::string& name, const std::string& file) {
+    return "<imageEntry><name>" + name + "</name><getters><getter class=\"TGAFileLoader\"><text>" +
+           file + "</text></getter></getters></imageEntry>\n";
+}
+
+std::string definitions(const std::string& entries) {
+    return "<imagedefs><imageEntries>" + entries + "</imageEntries></imagedefs>";
+}
+
+typedef ToolRuns ToolTest;
 
 TEST_F(ToolTest, PacksListsAndPrints) {
     scratch.write("in/.symlinks", "b>a\n");
     scratch.write("in/sub/zero", std::string("\0\r\n", 3));
-    EXPECT_EQ(pells("pack -o one.pell in").status, 0);
-    EXPECT_EQ(pells("pack in/ --output two.pell").out, "");
-    EXPECT_EQ(readFile("one.pell"), readFile("two.pell"));
-    EXPECT_EQ(pells("list one.pell").out, "        12  .symlinks\n        11  sub/zero\n");
-    EXPECT_EQ(pells("cat one.pell 'sub\\zero'").out, std::string("\0\r\n", 3));
+    EXPECT_EQ(pells("pack in/ --output a.pell").out, "");
+    EXPECT_EQ(pells("list a.pell").out, "        12  .symlinks\n        11  sub/zero\n");
+    EXPECT_EQ(pells("cat a.pell 'sub\\zero'").out, std::string("\0\r\n", 3));
     EXPECT_EQ(pells("--version").out.substr(0, 6), "pells ");
     EXPECT_NE(pells("sheet --help").out.find("--output"), std::string::npos);
 }
@@ -48,48 +36,31 @@ TEST_F(ToolTest, FailsWithOneLineAndLeavesNothing) {
         {"frob", "unknown command 'frob' (see --help)"},
         {"--frob", "unknown option '--frob' (see --help)"},
         {"pack in", "pack: --output is required (see --help)"},
-        {"pack -o out.pell", "pack: DIR is required (see --help)"},
-        {"list good.pell x", "list: The following argument was not expected: x (see --help)"},
-        {"resolve root", "resolve: NAME is required (see --help)"},
         {"pack -o out.pell missing", "pack: missing: No such file or directory"},
-        {"pack -o missing/out.pell in", "pack: missing/out.pell: No such file or directory"},
+        {"pack -o in in", "pack: in: Is a directory"},
         {"pack -o in/out.pell in",
          "pack: in/out.pell: The archive would lie in the folder that it packs"},
         {"pack -o good.pell unpackable",
          "pack: good.pell: member 'a\\x0ab': the name has a line break, which ends a directory "
          "entry"},
-        {"list missing.pell", "list: missing.pell: Can't open pell file"},
         {"cat good.pell nope", "cat: good.pell: The archive has no member 'nope'"},
         {"cat cut.pell a", "cat: cut.pell: member 'a': Can't read pell data stream for member 'a'"},
-        {"resolve text a", "resolve: text: Not a directory"},
-        {"sheet root -o missing/s.png", "sheet: missing/s.png: No such file or directory"},
+        {"resolve good.pell a", "resolve: good.pell: Not a directory"},
         {"sheet root -o /dev/null", "sheet: /dev/null: Not a regular file"},
         {"sheet in -o good.pell",
          "sheet: asset Data/images.xml: Couldn't open the specified file from disc: "
          "in/Data/images.xml"},
-        {"sheet wrong -o good.pell",
-         "sheet: asset Data/images.xml: ImageFallbackManager:Constructor for ImageFallbackManager "
-         "opened an XML file that did not have the correct 'imagedefs' format."},
-        {"sheet malformed -o good.pell",
-         "sheet: asset Data/images.xml: Malformed XML: premature EOF"},
-        {"list good.pell >/dev/full", "list: standard output: No space left on device"},
-        {"cat good.pell a >/dev/full", "cat: standard output: No space left on device"},
+        {"sheet root -o good.pell >/dev/full", "sheet: standard output: No space left on device"},
         {"--help >/dev/full", "standard output: No space left on device"},
         {"cat good.pell a >&-", "cat: standard output: Bad file descriptor"},
         // As good as a full disk.
         {"--version >/dev/null; ulimit -f 4; \"$PELLS\" pack -o good.pell noise",
          "pack: good.pell: File too large"},
     };
-    scratch.write("text", "text");
     scratch.write("in/sub/file", "x");
     scratch.write("unpackable/a\nb", "x");
     scratch.write("noise/big", noise(100000));
-    scratch.write("wrong/Data/images.xml", "<images></images>");
-    scratch.write("malformed/Data/images.xml", "<imagedefs/>");
-    scratch.write("root/Data/images.xml",
-                  "<imagedefs><imageEntries><imageEntry><name>a</name><getters><getter "
-                  "class=\"TGAFileLoader\"><text>a.tga</text></getter></getters></imageEntry>"
-                  "</imageEntries></imagedefs>");
+    scratch.write("root/Data/images.xml", definitions(definition("a", "a.tga")));
     scratch.write("good.pell", archiveOf({{"a", "hello\n"}, {"big", std::string(3000000, 'x')}}));
     scratch.write("cut.pell", archiveWithDirectory("O99 L9 |a\r\n"));
     for (const Failing& each : cases)
@@ -115,68 +86,55 @@ TEST_F(ToolTest, KeepsTheOldOutputWhenItIsInterrupted) {
     EXPECT_EQ(interrupted.out, "1\n");
     EXPECT_EQ(files(), (Lines{"in", "out.pell"}));
     EXPECT_EQ(readFile("out.pell"), "old");
-
-    prepareSamples();
-    EXPECT_EQ(pells("sheet assets -o out.pell >/dev/full").status, 1);
-    EXPECT_EQ(readFile("out.pell"), "old");
 }
 
-const std::string badAsset =
-    "pells: warning: Bad .asset file: assets/broken.asset: Input file not a pell file\n";
-
-TEST_F(ToolTest, ResolvesNamesToWhatServesThem) {
-    prepareSamples();
-    const Outcome outcome = pells(
-        "resolve assets Textures/wood.tga Textures/brick.tga Textures/marble.tga Maps/height.tga "
-        "Pictures/oak.tga Textures/rock.tga 'Icons\\badge.tga' Data");
-    EXPECT_EQ(outcome.status, 1);
-    EXPECT_EQ(outcome.err, badAsset + "pells: resolve: assets: 2 names of 8 not found\n");
-    EXPECT_EQ(outcome.out,
-              "Textures/wood.tga: member Textures/wood.tga of assets/textures.asset\n"
+// The sample root with its archives and write times.
+TEST_F(ToolTest, ResolvesAndDrawsTheSamples) {
+    const Outcome prepared = shell(R"(set -e
+        cp -r ')" PELLS_SAMPLES R"(/root' assets
+        for name in textures maps patch; do
+            "$PELLS" pack -o assets/$name.asset ')" PELLS_SAMPLES R"('/archives/$name
+        done
+        for name in rose flag; do
+            "$PELLS" pack -o assets/Data/$name.pell ')" PELLS_SAMPLES R"('/pictures/$name
+        done
+        find assets -exec touch -d 2020-01-01 {} +
+        touch -d 2020-02-01 assets/maps.asset assets/textures.asset
+        touch -d 2020-03-01 assets/patch.asset
+        touch -d 2020-04-01 assets/Textures/marble.tga)");
+    ASSERT_EQ(prepared.status, 0) << prepared.err;
+    const std::string badAsset =
+        "pells: warning: Bad .asset file: assets/broken.asset: Input file not a pell file\n";
+    const Outcome resolved = pells(
+        "resolve assets Textures/brick.tga Textures/marble.tga Pictures/oak.tga Textures/rock.tga "
+        "'Icons\\badge.tga'");
+    EXPECT_EQ(resolved.status, 1);
+    EXPECT_EQ(resolved.err, badAsset + "pells: resolve: assets: 1 name of 5 not found\n");
+    EXPECT_EQ(resolved.out,
               "Textures/brick.tga: member Textures/brick.tga of assets/patch.asset, newer than "
               "assets/textures.asset\n"
               "Textures/marble.tga: plain file assets/Textures/marble.tga, newer than the copy in "
               "assets/textures.asset\n"
-              "Maps/height.tga: member Maps/height.tga of assets/maps.asset\n"
               "Pictures/oak.tga: alias of Textures/wood.tga, member Textures/wood.tga of "
               "assets/textures.asset\n"
               "Textures/rock.tga: nowhere\n"
-              "Icons\\badge.tga: plain file assets/Icons/badge.tga, in no archive\n"
-              "Data: nowhere\n");
+              "Icons\\badge.tga: plain file assets/Icons/badge.tga, in no archive\n");
 
-    fs::last_write_time("assets/patch.asset", fs::last_write_time("assets/textures.asset"));
-    const Outcome tie = pells("resolve assets Textures/brick.tga");
-    EXPECT_EQ(tie.status, 0);
-    EXPECT_NE(tie.out.find("(equal write times: the archive that the folder lists first)"),
-              std::string::npos)
-        << tie.out;
-}
-
-TEST_F(ToolTest, DrawsTheSampleSheet) {
-    prepareSamples();
-    const Outcome outcome = pells("sheet assets -o sheet.png --log time.summary");
-    EXPECT_EQ(outcome.status, 0);
-    EXPECT_EQ(outcome.err,
+    const Outcome drawn = pells("sheet assets -o sheet.png");
+    EXPECT_EQ(drawn.err,
               badAsset +
                   "pells: warning: packed: TGAFileLoader Damaged/packed.tga: image type 10 is "
                   "run-length encoded: packets are read as pixels\n");
-    EXPECT_EQ(outcome.out,
-              "flag: fell back to PellTGAFileLoader assets/Data/flag.pell\n"
-              "  PellTGAFileLoader assets/Data/missing.pell: Can't read pell file: Can't open pell "
-              "file\n"
-              "glow: fell back to TGAFileLoader Icons/glow.tga\n"
-              "  TGAFileLoader Damaged/cut.tga: tga file shorter than data\n"
-              "  PellTGAFileLoader assets/Damaged/notes.pell: Can't read pell file: Input file not "
-              "a pell file\n"
-              "lost: not found\n"
-              "  TGAFileLoader Textures/lost.tga: Couldn't open the specified file from disc: "
-              "assets/Textures/lost.tga\n"
-              "  TGAFileLoader Damaged/cut.tga: tga file shorter than data\n"
-              "rose: fell back to PellTGAFileLoader assets/Data/rose.pell\n"
-              "  TGAFileLoader Textures/rose.tga: Couldn't open the specified file from disc: "
-              "assets/Textures/rose.tga\n"
-              "17 of 18 pictures found, 3 of them by a fallback\n");
-    EXPECT_NE(readFile("pells.log").find("\ntime.summary: Category"), std::string::npos);
+    for (const char* const part :
+         {"glow: fell back to TGAFileLoader Icons/glow.tga\n"
+          "  TGAFileLoader Damaged/cut.tga: tga file shorter than data\n"
+          "  PellTGAFileLoader assets/Damaged/notes.pell: Can't read pell file: Input file not a "
+          "pell file\n",
+          "lost: not found\n"
+          "  TGAFileLoader Textures/lost.tga: Couldn't open the specified file from disc: "
+          "assets/Textures/lost.tga\n",
+          "17 of 18 pictures found, 3 of them by a fallback\n"})
+        EXPECT_NE(drawn.out.find(part), std::string::npos) << part << drawn.out;
 
     // The heart's 9 x 8 pixels are shown as squares of 19 x 19, its dark outline among them.
     const std::vector<std::uint32_t> pixels = decodePng("sheet.png");
@@ -190,42 +148,24 @@ TEST_F(ToolTest, DrawsTheSampleSheet) {
 // Whatever the pictures and their names are, there is a sheet that says how each of them fared.
 TEST_F(ToolTest, DrawsWhatStrangersSend) {
     scratch.write("root/thin.tga", tgaHeader(1, 60000, 24) + std::string(180000, 'x'));
-    scratch.write("root/wide.tga", tgaHeader(60000, 2, 8) + std::string(120000, 'x'));
     scratch.write("root/empty.tga", tgaHeader(0, 5, 32));
     scratch.write("root/huge.tga", tgaHeader(65535, 65535, 32) + "x");
     scratch.write("root/mapped.tga", tgaHeader(2, 2, 8, 0, 1) + "abcd");
     scratch.write("root/damaged.asset", archiveWithDirectory("O15 L4 |bad.tga\r\n", "JUNK"));
-    std::string entries;
-    const auto define = [&](const std::string& name, const std::string& file) {
-        entries += "<imageEntry><name>" + name +
-                   "</name><getters><getter class=\"TGAFileLoader\"><text>" + file +
-                   "</text></getter></getters></imageEntry>\n";
-    };
-    for (const char* name : {"thin", "wide", "empty", "huge", "mapped", "bad"})
-        define(name, std::string(name) + ".tga");
-    define("\xFF\x1B[31m\xC3", "thin.tga");
-    define(std::string(100000, 'n'), std::string(3000, 'f'));
+    std::string entries = definition("\xFF\x1B[31m\xC3", "thin.tga") +
+                          definition(std::string(100000, 'n'), std::string(3000, 'f'));
+    for (const char* name : {"empty", "huge", "bad"})
+        entries += definition(name, std::string(name) + ".tga");
     for (int i = 0; i < 300; ++i)
-        define("many " + std::to_string(i), "mapped.tga");
-    scratch.write("root/Data/images.xml",
-                  "<imagedefs><imageEntries>" + entries + "</imageEntries></imagedefs>");
+        entries += definition("many " + std::to_string(i), "mapped.tga");
+    scratch.write("root/Data/images.xml", definitions(entries));
 
-    const Outcome outcome = pells("sheet root -o sheet.png");
-    EXPECT_EQ(outcome.status, 0);
+    const std::string out = pells("sheet root -o sheet.png").out;
     for (const char* part : {"\nhuge: not found\n  TGAFileLoader huge.tga: tga ",
                              "bad: not found\n  TGAFileLoader bad.tga: ",
-                             "\n305 of 308 pictures found, 0 of them by a fallback\n"})
-        EXPECT_NE(outcome.out.find(part), std::string::npos) << part;
-    EXPECT_NE(outcome.err.find("pells: warning: mapped: TGAFileLoader mapped.tga: image type 1 is "
-                               "colour-mapped: indexes are read as pixels\n"),
-              std::string::npos);
+                             "\n302 of 305 pictures found, 0 of them by a fallback\n"})
+        EXPECT_NE(out.find(part), std::string::npos) << part;
     EXPECT_FALSE(decodePng("sheet.png").empty());
-    // Silence in the log takes the reasons away, and nothing else.
-    const Outcome silent = pells("sheet root -o sheet.png --log -error");
-    EXPECT_EQ(silent.status, 0);
-    EXPECT_NE(silent.out.find("\nhuge: not found\n  TGAFileLoader huge.tga: failed without a "
-                              "reason in the log\n"),
-              std::string::npos);
 }
 
 }  // namespace
