@@ -10,7 +10,6 @@
 #include "pells/material/material.h"
 #include "support/test_prefs.h"
 #include "support/tga_file.h"
-#include "support/tool_runs.h"
 #include "tools/sphere.h"
 
 namespace {
@@ -116,74 +115,6 @@ TEST_F(Sphere, StandsAnyNumber) {
         const Thumbnail sphere = renderSphere(material, texture.get(), size);
         EXPECT_EQ(at(sphere, size / 2, size / 2) >> 8 & 255, 255U) << odd;
     }
-}
-
-typedef ToolRuns SwatchTest;
-
-TEST_F(SwatchTest, FailsWithOneLineAndLeavesNothing) {
-    const Failing cases[] = {
-        {"", "MATERIAL.xml or --blend is required (see --help)"},
-        {"--blend plain.xml", "--blend: 2 required A.xml B.xml missing (see --help)"},
-        {"missing.xml", "missing.xml: No such file or directory"},
-        {"/dev/zero", "/dev/zero: Not a regular file"},
-        {"text.xml", "text.xml: It does not begin with an XML element"},
-        {"--blend plain.xml cut.xml", "cut.xml: Malformed XML: premature EOF"},
-        {"colour.xml", "colour.xml: Failed to scan text value"},
-        {"plain.xml wood.xml", "wood.xml: texture 'wood.tga': --root is needed to find it"},
-        {"wood.xml --root root",
-         "wood.xml: texture 'wood.tga': Couldn't open the specified file from disc: root/wood.tga"},
-        {"none.xml --root root", "none.xml: texture 'none.tga': The picture has no pixels"},
-        {"short.xml --root root --log -error",
-         "short.xml: texture 'short.tga': failed without a reason in the log"},
-    };
-    scratch.write("plain.xml", "<material/>");
-    scratch.write("text.xml", "material");
-    scratch.write("cut.xml", "<material><shininess>5</shininess>");
-    scratch.write("colour.xml", "<material><diffuse r=\"0.5x\"/></material>");
-    for (const std::string name : {"wood", "short", "none"})
-        scratch.write(name + ".xml", "<m><texname>" + name + ".tga</texname></m>");
-    scratch.write("root/short.tga", tgaHeader(9, 9, 24) + "x");
-    scratch.write("root/none.tga", tgaHeader(0, 9, 24));
-    scratch.write("out.png", "old");
-    for (const Failing& each : cases)
-        expectFailure(std::string("swatch -o out.png ") + each.first,
-                      std::string("pells: swatch: ") + each.second, "out.png");
-}
-
-TEST_F(SwatchTest, DrawsMaterialsTheirBlendAndTheCheckerboardBehindThem) {
-    // Black but for the light that it gives off.
-    const auto write = [this](const std::string& name, const std::string& emissive, char alpha) {
-        scratch.write(name + ".xml", "<m><ambient r='0' g='0' b='0' a='1'/><emissive a='1' " +
-                                         emissive + "/><diffuse r='0' g='0' b='0' a='" + alpha +
-                                         "'/></m>");
-    };
-    write("red", "r='1' g='0' b='0'", '1');
-    write("blue", "r='0' g='0' b='1'", '1');
-    write("unseen", "r='0' g='0' b='0'", '0');
-    EXPECT_EQ(pells("swatch -o out.png --blend red.xml blue.xml red.xml unseen.xml").err, "");
-    const std::vector<std::uint32_t> pixels = decodePng("out.png");
-    const auto spheres = [&pixels](std::uint32_t colour) {
-        // A sphere of 196 pixels has 30172 of them, some at its edge.
-        return std::count(pixels.begin(), pixels.end(), colour) / 29500;
-    };
-    EXPECT_EQ(spheres(0xFF0000), 2);
-    EXPECT_EQ(spheres(0x0000FF), 1);
-    EXPECT_EQ(spheres(0xFF00FF), 1);
-    EXPECT_GT(std::count(pixels.begin(), pixels.end(), 0xD9DDE3), 20000) << "checkerboard";
-}
-
-// The texture's name may have any bytes, and the document may come from a pipe.
-TEST_F(SwatchTest, DrawsSamplesAndWhatStrangersSend) {
-    scratch.write("odd.xml", "<m><texname>\xFF\x1B[31m.tga</texname></m>");
-    scratch.write("root/\xFF\x1B[31m.tga", tgaHeader(2, 2, 24, 0, 10) + std::string(12, 'x'));
-    const Outcome odd = pells("swatch <(cat odd.xml) --root root -o out.png");
-    EXPECT_EQ(odd.err.substr(odd.err.find("texture")),
-              "texture '\xFF\\x1b[31m.tga': image type 10 is run-length encoded: packets are read "
-              "as pixels\n");
-    EXPECT_EQ(odd.status, 0);
-    const std::string samples =
-        "'" PELLS_SAMPLES "'/materials/*.xml --root '" PELLS_SAMPLES "/root'";
-    EXPECT_EQ(pells("swatch -o out.png --log asset " + samples).status, 0);
 }
 
 }  // namespace
