@@ -184,9 +184,9 @@ TEST_F(ToolTest, ResolvesAndDrawsTheSamples) {
         "pells: warning: Bad .asset file: assets/broken.asset: Input file not a pell file\n";
     const Outcome resolved = pells(
         "resolve assets Textures/brick.tga Textures/marble.tga Pictures/oak.tga Textures/rock.tga "
-        "'Icons\\badge.tga'");
+        "'Icons\\badge.tga' Data");
     EXPECT_EQ(resolved.status, 1);
-    EXPECT_EQ(resolved.err, badAsset + "pells: resolve: assets: 1 name of 5 not found\n");
+    EXPECT_EQ(resolved.err, badAsset + "pells: resolve: assets: 2 names of 6 not found\n");
     EXPECT_EQ(resolved.out,
               "Textures/brick.tga: member Textures/brick.tga of assets/patch.asset, newer than "
               "assets/textures.asset\n"
@@ -195,7 +195,8 @@ TEST_F(ToolTest, ResolvesAndDrawsTheSamples) {
               "Pictures/oak.tga: alias of Textures/wood.tga, member Textures/wood.tga of "
               "assets/textures.asset\n"
               "Textures/rock.tga: nowhere\n"
-              "Icons\\badge.tga: plain file assets/Icons/badge.tga, in no archive\n");
+              "Icons\\badge.tga: plain file assets/Icons/badge.tga, in no archive\n"
+              "Data: nowhere\n");
 
     const Outcome drawn = pells("sheet assets -o sheet.png");
     EXPECT_EQ(drawn.err,
