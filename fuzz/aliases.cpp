@@ -2,7 +2,6 @@
 // LF CONTENT", with zero bytes between them.
 
 #include <cstdio>
-#include <utility>
 #include <vector>
 
 #include "fuzz/support/fuzz.h"
@@ -13,7 +12,7 @@
 
 namespace {
 
-typedef std::vector<std::pair<std::string, std::string>> Members;
+using pells_test::Members;
 
 Members membersOf(const std::string& input) {
     std::vector<std::string> pieces;

@@ -1,14 +1,8 @@
 #include "pells/asset/pell_archive.h"
 
-#if !defined(_WIN32)
-#include <sys/stat.h>
-#endif
-
 #include <algorithm>
-#include <functional>
 #include <locale>
 #include <random>
-#include <set>
 
 #include "support/archive_bytes.h"
 #include "support/test_prefs.h"
@@ -19,290 +13,187 @@ namespace {
 using namespace pells_test;
 using pells::pellibuf;
 using pells::pellistream;
-
-/// The message with which the bytes are refused as an archive, or "" when they are none.
-std::string refusalOf(const std::string& path) {
-    return thrown<pellibuf::BadPellFile>([&] { pellistream archive(path); });
-}
+using pells::ZlibWrapper;
 
 class PellArchive : public LibraryTest {
 protected:
-    PellArchive() { prefs()["log"] = "error"; }
-
     std::string write(const std::string& bytes) const { return writeArchiveFile(scratch, bytes); }
 };
 
-TEST_F(PellArchive, RefusesDamagedHeadersAndDirectoriesWithTheReason) {
+TEST_F(PellArchive, RefusesWhatIsNoArchiveWithTheReasonInAnyLocale) {
+    struct Grouping : std::numpunct<char> {
+        std::string do_grouping() const override { return "\1"; }
+    };
+    const std::string entry = "Pell file directory entry ";
     const std::pair<std::string, std::string> cases[] = {
-        {"", "Pell file too short for stamp"},
         {"PELLS", "Pell file too short for stamp"},
-        {"PELLS\n10v1.0\r\n\x1a", "Input file not a pell file"},
         {"pells 10v1.0\r\n\x1a", "Input file not a pell file"},
-        {"PELLS ", "Cannot read pell file header"},
-        {"PELLS xv1.0\r\n\x1a", "Cannot read pell file header"},
         {"PELLS 100000000v1.0\r\n\x1a", "Cannot read pell file header"},
-        {"PELLS 10v", "Cannot read pell file header"},
         {"PELLS 10v1.x\r\n\x1a", "Cannot read pell file header"},
         {"PELLS 10w1.0\r\n\x1a", "Bad pell file header format"},
         {"PELLS 10v1,0\r\n\x1a", "Bad pell file header format"},
         {"PELLS 10v1.0\n\x1a", "Bad pell file header format"},
-        {"PELLS 10v1.0 \r\n\x1a", "Bad pell file header format"},
-        {"PELLS 10v1.0\r\n", "Bad pell file header format"},
-        {"PELLS 10v2.0\r\n\x1a", "Bad pell file version 2.0, current version is 1.0"},
         {"PELLS 10v12.34\r\n\x1a", "Bad pell file version 12.34, current version is 1.0"},
         {"PELLS \n 0000000100 v 1 . 7\r\n\x1a", ""},
         {"PELLS ffffffffv1.0\r\n\x1a", ""},
+        {archiveWithDirectory("\x1aO"), ""},
+        {archiveWithDirectory("X0 L2 O00000000ffffffff \x1a"), ""},
+        {archiveWithDirectory("O1 \x1a"), entry + "'': missing field 'L'"},
+        {archiveWithDirectory("L2 |a\r\n"), entry + "'a': missing field 'O'"},
+        {archiveWithDirectory("O1 L0x2 |a\r\n"), entry + "'a': bad field 'L': '0x2'"},
+        {archiveWithDirectory("O100000000 L1"), entry + "'': bad field 'O': '100000000'"},
+        {archiveWithDirectory("O"), "Cannot read pell file directory entry"},
+        {archiveWithDirectory("O1 L2 |"), "Cannot read pell file member name"},
+        {archiveWithDirectory("O1 L2 |a\n"), "Bad pell file member name"},
     };
-    for (const auto& each : cases)
-        EXPECT_EQ(refusalOf(write(each.first)), each.second) << each.first;
-    const std::pair<std::string, std::string> directories[] = {
-        {"", ""},
-        {"\x1aO", ""},
-        {"O1 L2 |a\r\n\x1aO", ""},
-        {"O", "Cannot read pell file directory entry"},
-        {"O1 L2 |", "Cannot read pell file member name"},
-        {"O1 L2 |a\n", "Bad pell file member name"},
-        {"L2 |a\r\n", "Pell file directory entry 'a': missing field 'O'"},
-        {"O1 |a\r\n", "Pell file directory entry 'a': missing field 'L'"},
-        {"O1 L2g |a\r\n", "Pell file directory entry 'a': bad field 'L': '2g'"},
-        {"O1 L100000000 |a\r\n", "Pell file directory entry 'a': bad field 'L': '100000000'"},
-        {"O1", "Pell file directory entry '': missing field 'L'"},
-    };
-    for (const auto& each : directories)
-        EXPECT_EQ(refusalOf(write(archiveWithDirectory(each.first))), each.second) << each.first;
+    for (const std::locale& locale :
+         {std::locale::classic(), std::locale(std::locale::classic(), new Grouping)}) {
+        const std::locale before = std::locale::global(locale);
+        for (const auto& each : cases) {
+            const std::string path = write(each.first);
+            EXPECT_EQ(thrown<pellibuf::BadPellFile>([&] { pellistream archive(path); }),
+                      each.second)
+                << each.first;
+        }
+        std::locale::global(before);
+    }
 }
 
-TEST_F(PellArchive, OpensRegularFilesOnly) {
-#if !defined(_WIN32)
-    ASSERT_EQ(mkfifo("pipe", 0600), 0);
-#endif
-    for (const std::string path : {"none", "", ".", "pipe", "/dev/zero"})
-        EXPECT_EQ(refusalOf(path), "Can't open pell file") << path;
+TEST_F(PellArchive, ReadsDirectoriesOfAnySizeInAnyOrder) {
+    std::mt19937 random(11);
+    std::string text;
+    std::map<std::string, std::uint32_t> expected;
+    for (int i = 0; i < 10000; ++i) {
+        // Told apart by the last character only, by the length or by a zero byte, some of them not.
+        const std::size_t lengths[] = {0, 7, 8, 9, 16, 256, 300};
+        std::string name(lengths[random() % 7], 'n');
+        for (auto letters = random() % 4; letters != 0; --letters)
+            name += "\0a\xFF"[random() % 3];
+        const auto number = static_cast<std::uint32_t>(random());
+        text += "O" + hexadecimal(number / 3) + " L" + hexadecimal(number) + " |" + name + "\r\n";
+        expected[name] = number;
+    }
+    const pellistream archive(write(archiveWithDirectory(text)));
+    ASSERT_EQ(archive.getDirectory().size(), expected.size());
+    for (const auto& entry : archive.getDirectory()) {
+        EXPECT_EQ(entry.second.length, expected.at(entry.first));
+        EXPECT_EQ(entry.second.offset, expected.at(entry.first) / 3);
+    }
 }
 
 TEST_F(PellArchive, FindsMembersByNameAndServesThemAgain) {
-    pellistream archive(write(archiveOf(
-        {{"b/\\c", "backslash"}, {"a/b", "one\ntwo\n"}, {"empty", ""}, {"a/b", "ONE\nTWO"}})));
+    pellistream archive(write(
+        archiveOf({{"b/\\c", "back\nslash"}, {"a/b", "old"}, {"empty", ""}, {"a/b", "new"}})));
     EXPECT_EQ(Lines(archive.begin(), archive.end()), (Lines{"a/b", "b/\\c", "empty"}));
-    EXPECT_EQ(archive.getDirectory().at("empty").length, deflated("").size());
-
     EXPECT_EQ(archive.get(), EOF);
     for (const std::string name : {"a/b", "a\\b"}) {
         ASSERT_TRUE(archive.open(name));
         EXPECT_EQ(archive.getMemberName(), name);
-        EXPECT_EQ(readAll(archive), "ONE\nTWO");
-        EXPECT_EQ(archive.get(), EOF);
+        EXPECT_EQ(readAll(archive), "new");
     }
     ASSERT_TRUE(archive.open("b/\\c"));
-    archive.get();
-    EXPECT_FALSE(archive.open("B/\\c"));
+    EXPECT_EQ(archive.get(), 'b');
+    EXPECT_FALSE(archive.open("A/b"));
     EXPECT_EQ(archive.getMemberName(), "");
     ASSERT_TRUE(archive.open("empty"));
-    EXPECT_EQ(archive.get(), EOF);
-    ASSERT_TRUE(archive.open("b/\\c"));
-    std::string line;
-    EXPECT_TRUE(std::getline(archive, line));
-    EXPECT_EQ(line, "backslash");
+    EXPECT_EQ(readAll(archive), "");
 }
 
 TEST_F(PellArchive, ReadsTheSameBytesInPiecesOfAnySize) {
     const std::string bytes = noise(200000) + std::string(100000, 'x') + noise(3000);
     pellistream archive(write(archiveOf({{"m", bytes}})));
-    for (const std::size_t size : {1u, 2u, 7u, 1023u, 1024u, 1025u, 1026u, 65536u, 400000u}) {
+    for (const std::size_t size : {1u, 7u, 1023u, 1024u, 1025u, 1026u, 65536u, 400000u}) {
         ASSERT_TRUE(archive.open("m"));
         std::string read;
         std::vector<char> piece(size);
-        while (archive.read(piece.data(), static_cast<std::streamsize>(size)) || archive.gcount()) {
-            read.append(piece.data(), static_cast<std::size_t>(archive.gcount()));
-            if (!archive)
-                break;
+        while (archive.read(piece.data(), static_cast<std::streamsize>(size))) {
+            read.append(piece.data(), size);
             // Whatever way a character was read, it can be put back.
-            ASSERT_TRUE(archive.putback(read.back()));
-            ASSERT_EQ(archive.get(), static_cast<unsigned char>(read.back()));
+            ASSERT_EQ(archive.putback(read.back()).get(), static_cast<unsigned char>(read.back()));
         }
+        read.append(piece.data(), static_cast<std::size_t>(archive.gcount()));
         EXPECT_TRUE(read == bytes) << size;
     }
 }
 
-TEST_F(PellArchive, ReadsInTheClassicLocaleWhateverTheGlobalOneIs) {
-    struct Grouping : std::numpunct<char> {
-        std::string do_grouping() const override { return "\1"; }
-    };
-    const std::locale before =
-        std::locale::global(std::locale(std::locale::classic(), new Grouping));
-    const std::string refusal = refusalOf(write(archiveOf({{"m", "text"}})));
-    const std::string versionRefusal = refusalOf(write("PELLS 10v12.0\r\n\x1a"));
-    std::locale::global(before);
-    EXPECT_EQ(refusal, "");
-    EXPECT_EQ(versionRefusal, "Bad pell file version 12.0, current version is 1.0");
-}
-
-/// Reads a member in pieces until it ends or throws; returns what came.
-std::string readUntilFailure(pellistream& archive, std::size_t size, std::string& failure) {
-    std::string read;
-    std::vector<char> piece(size);
-    failure.clear();
-    try {
-        while (archive.read(piece.data(), static_cast<std::streamsize>(size)))
-            read.append(piece.data(), size);
-        read.append(piece.data(), static_cast<std::size_t>(archive.gcount()));
-    } catch (const pellibuf::BadPellFile& error) {
-        failure = error.what();
-    } catch (const pells::ZlibWrapper::ZlibError& error) {
-        failure = error.what();
-    }
-    return read;
-}
-
-TEST_F(PellArchive, ServesWhatComesBeforeTheEndOfACutFile) {
-    const std::string bytes = noise(300000);
-    const std::string good = deflated("good");
-    // The end mark keeps the data that follows out of the directory.
-    std::string cut = archiveWithDirectory(
-        "O15 L4 |short\r\nO1 L80000000 |beyond\r\n"
-        "Offffffff L1 |nowhere\r\nO15 L" +
-            hexadecimal(good.size()) + " |good\r\nO200000 L200000 |m\r\n\x1a",
-        good);
-    cut.resize(0x200000, '\0');
-    pellistream archive(write(cut + deflated(bytes).substr(0, 200000)));
+struct Reading {
+    std::string bytes;
     std::string failure;
-    for (const std::size_t size : {1u, 1000u, 4096u}) {
-        ASSERT_TRUE(archive.open("m"));
-        const std::string read = readUntilFailure(archive, size, failure);
-        EXPECT_EQ(failure, "Can't read pell data stream for member 'm'");
-        EXPECT_GT(read.size(), 200000u - 1024 - size) << size;
-        EXPECT_TRUE(bytes.compare(0, read.size(), read) == 0) << size;
-        archive.clear();
-        EXPECT_THROW(archive.get(), pellibuf::BadPellFile);
-    }
-    for (const std::string name : {"beyond", "nowhere"}) {
-        ASSERT_TRUE(archive.open(name));
-        readUntilFailure(archive, 1000000, failure);
-        EXPECT_NE(failure, "") << name;
-    }
-    ASSERT_TRUE(archive.open("short"));
-    EXPECT_LT(readUntilFailure(archive, 10, failure).size(), 4u);
-    EXPECT_EQ(failure, "");
-    ASSERT_TRUE(archive.open("good"));
-    EXPECT_EQ(readAll(archive), "good");
+};
+
+/// What comes of a member in pieces of some size before it ends or throws.
+Reading readMember(pellistream& archive, const std::string& name, std::size_t size) {
+    Reading reading;
+    std::vector<char> piece(size);
+    EXPECT_TRUE(archive.open(name)) << name;
+    const std::string fileFailure = thrown<pellibuf::BadPellFile>([&] {
+        reading.failure = thrown<ZlibWrapper::ZlibError>([&] {
+            while (archive.read(piece.data(), static_cast<std::streamsize>(size)))
+                reading.bytes.append(piece.data(), size);
+            reading.bytes.append(piece.data(), static_cast<std::size_t>(archive.gcount()));
+        });
+    });
+    reading.failure += fileFailure;
+    return reading;
 }
 
-/// What comes of a zlib stream, read in blocks of 1024 bytes and inflated in pieces of 1023 (the
-/// first one 1024), before the piece in which it is damaged.
-std::string inflatedBeforeDamage(const std::string& stream) {
-    z_stream zlib = {};
-    inflateInit(&zlib);
-    std::string all;
-    char piece[1024];
-    int result = Z_OK;
-    for (std::size_t at = 0; result == Z_OK && at < stream.size();) {
-        const uInt room = all.empty() ? 1024 : 1023;
-        zlib.next_out = reinterpret_cast<Bytef*>(piece);
-        zlib.avail_out = room;
-        do {
-            if (zlib.avail_in == 0) {
-                zlib.next_in = reinterpret_cast<Bytef*>(const_cast<char*>(stream.data())) + at;
-                zlib.avail_in = static_cast<uInt>(std::min<std::size_t>(1024, stream.size() - at));
-                at += zlib.avail_in;
-            }
-            result = inflate(&zlib, Z_NO_FLUSH);
-        } while (result == Z_OK && zlib.avail_out == room && at < stream.size());
-        if (result == Z_OK || result == Z_STREAM_END)
-            all.append(piece, room - zlib.avail_out);
-    }
-    inflateEnd(&zlib);
-    return all;
-}
-
-TEST_F(PellArchive, ServesTheSamePartOfADamagedMemberInPiecesOfAnySize) {
+TEST_F(PellArchive, ServesWhatComesBeforeTheDamageInPiecesOfAnySize) {
     std::mt19937 random(5);
     std::string bytes;
     while (bytes.size() < 600000)
         bytes += hexadecimal(random() >> random() % 32);
+    bytes.resize(600000);
     const std::string good = archiveOf({{"m", bytes}});
-    const std::size_t dataSize = archiveHeaderSize + deflated(bytes).size();
-    const auto damagedAt = [&good](std::size_t at, std::size_t size) {
-        return std::string(good).replace(at, size, size, '\xFF');
+    const std::size_t dataSize = deflated(bytes).size();
+    const auto writeDamaged = [&](std::size_t at, std::size_t size) {
+        return write(std::string(good).replace(archiveHeaderSize + at, size, size, '\xFF'));
     };
-    std::set<std::string> failures;
-    for (std::size_t at = dataSize / 16; at < dataSize - 200; at += dataSize / 16) {
-        pellistream archive(write(damagedAt(at, at % 2 ? 1 : 200)));
-        std::string expectedFailure;
-        std::string failure;
-        ASSERT_TRUE(archive.open("m"));
-        const std::string expected = readUntilFailure(archive, 1, expectedFailure);
-        const std::string damaged = damagedAt(at, at % 2 ? 1 : 200);
-        EXPECT_TRUE(expected == inflatedBeforeDamage(damaged.substr(archiveHeaderSize,
-                                                                    dataSize - archiveHeaderSize)))
-            << at;
+    for (std::size_t at = 1000; at < dataSize - 200; at += dataSize / 16 | 1) {
+        pellistream archive(writeDamaged(at, at % 2 ? 1 : 200));
+        const Reading expected = readMember(archive, "m", 1);
+        // The text compresses evenly.
+        EXPECT_GT(expected.bytes.size() + 10000, bytes.size() * at / dataSize);
         for (const std::size_t size : {1025u, 4096u, 50000u, 300000u}) {
-            ASSERT_TRUE(archive.open("m"));
-            const std::string read = readUntilFailure(archive, size, failure);
-            EXPECT_EQ(failure, expectedFailure) << at;
-            EXPECT_LE(read.size(), expected.size() + 1024);
-            EXPECT_GT(read.size() + size + 1024, expected.size());
-            const std::size_t both = std::min(read.size(), expected.size());
-            EXPECT_EQ(read.compare(0, both, expected, 0, both), 0) << at << ' ' << size;
+            const Reading reading = readMember(archive, "m", size);
+            EXPECT_EQ(reading.failure, expected.failure) << at;
+            EXPECT_GT(reading.bytes.size() + size + 1024, expected.bytes.size()) << at;
+            const std::size_t both = std::min(reading.bytes.size(), expected.bytes.size());
+            EXPECT_EQ(reading.bytes.compare(0, both, expected.bytes, 0, both), 0)
+                << at << ' ' << size;
         }
-        failures.insert(failure);
     }
-    EXPECT_GT(failures.size(), 1u) << "damaged data and damaged checksums";
+    pellistream noHeader(writeDamaged(0, 1));
+    EXPECT_EQ(readMember(noHeader, "m", 1).failure,
+              "ZlibInflater::read(): bad pell data stream for member 'm': Z_DATA_ERROR (-3): "
+              "incorrect header check");
+    EXPECT_TRUE(noHeader.bad());
 
     // Whoever asks for just the bytes of a member learns that its checksum is wrong, too.
-    pellistream archive(write(damagedAt(dataSize - 4, 4)));
+    pellistream archive(writeDamaged(dataSize - 4, 4));
     ASSERT_TRUE(archive.open("m"));
-    std::vector<char> piece(20000);
-    for (std::size_t left = bytes.size(); left > piece.size(); left -= piece.size())
-        archive.read(piece.data(), 20000);
-    const auto rest = static_cast<std::streamsize>((bytes.size() - 1) % piece.size() + 1);
-    EXPECT_THROW(archive.read(piece.data(), rest), pells::ZlibWrapper::ZlibError);
-}
-
-TEST_F(PellArchive, DamagedMembersThrowFromEveryWayOfReading) {
-    std::string bytes = archiveOf({{"bad", noise(5000)}, {"good", "good"}});
-    bytes[archiveHeaderSize] = '\0';
-    pellistream archive(write(bytes));
-    const std::string message =
-        "ZlibInflater::read(): bad pell data stream for member 'bad': Z_DATA_ERROR (-3): "
-        "incorrect header check";
-    char piece[2000];
-    std::string line;
-    const std::function<void()> ways[] = {
-        [&] { archive.read(piece, sizeof piece); }, [&] { std::getline(archive, line); },
-        [&] { archive >> line; }, [&] { archive.ignore(10); }, [&] { archive.get(); }};
-    for (const auto& read : ways) {
-        ASSERT_TRUE(archive.open("bad"));
-        EXPECT_EQ(thrown<pells::ZlibWrapper::ZlibError>(read), message);
-        EXPECT_TRUE(archive.bad());
-        ASSERT_TRUE(archive.open("good"));
-        EXPECT_EQ(readAll(archive), "good");
-    }
-    EXPECT_EQ(logLines("error: "), Lines(5, message));
+    EXPECT_TRUE(archive.ignore(580000));
+    EXPECT_THROW(archive.read(&bytes[0], 20000), ZlibWrapper::ZlibError);
 }
 
 TEST_F(PellArchive, SurvivesEveryCutAndEveryFlippedByte) {
-    // Reads every member two ways. What is no documented refusal leaves the function.
+    // What is no documented refusal leaves the function.
     const auto readAllMembers = [](const std::string& path) {
         thrown<pellibuf::BadPellFile>([&] {
             pellistream archive(path);
             for (const std::string& name : archive) {
-                std::string failure;
-                for (const std::size_t size : {100u, 10000u}) {
-                    EXPECT_TRUE(archive.open(name));
-                    EXPECT_LT(readUntilFailure(archive, size, failure).size(), 100000u);
-                }
+                for (const std::size_t size : {100u, 10000u})
+                    EXPECT_LT(readMember(archive, name, size).bytes.size(), 100000u);
             }
         });
     };
     const std::string good =
         archiveOf({{"a.txt", "hello hello hello hello"}, {"dir/noise", noise(1500)}});
     for (std::size_t at = 0; at < good.size(); ++at) {
-        EXPECT_NO_THROW(readAllMembers(write(good.substr(0, at)))) << at;
-        for (const int bits : {0x01, 0xFF}) {
-            std::string flipped = good;
-            flipped[at] = static_cast<char>(flipped[at] ^ bits);
-            EXPECT_NO_THROW(readAllMembers(write(flipped))) << at;
-        }
+        std::string damaged[] = {good.substr(0, at), good, good};
+        damaged[1][at] = static_cast<char>(good[at] ^ 0x01);
+        damaged[2][at] = static_cast<char>(good[at] ^ 0xFF);
+        for (const std::string& bytes : damaged)
+            EXPECT_NO_THROW(readAllMembers(write(bytes))) << at;
     }
 }
 

@@ -38,8 +38,10 @@ inline std::string archiveWithDirectory(const std::string& directory,
     return header + data + directory;
 }
 
-/// An archive of members with these names and contents.
-inline std::string archiveOf(const std::vector<std::pair<std::string, std::string>>& members) {
+/// Names and contents.
+typedef std::vector<std::pair<std::string, std::string>> Members;
+
+inline std::string archiveOf(const Members& members) {
     std::string data;
     std::string directory;
     for (const auto& member : members) {

@@ -3,8 +3,6 @@
 #include <boost/filesystem/operations.hpp>
 #include <ctime>
 #include <string>
-#include <utility>
-#include <vector>
 
 #include "pells/asset/asset_manager.h"
 #include "support/archive_bytes.h"
@@ -27,8 +25,7 @@ protected:
             boost::filesystem::last_write_time(path, written);
     }
 
-    void writeArchive(const std::string& name,
-                      const std::vector<std::pair<std::string, std::string>>& members,
+    void writeArchive(const std::string& name, const Members& members,
                       std::time_t written = 0) const {
         write(name, archiveOf(members), written);
     }
