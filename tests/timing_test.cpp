@@ -30,33 +30,27 @@ TEST_F(TimestampTest, CarriesAndBorrowsBetweenItsHalves) {
     EXPECT_TRUE(Timestamp(4, most) < Timestamp(5, 0));
 }
 
-struct Case {
-    Timestamp a, b;
-    std::int32_t difference;
-};
-
-TEST_F(TimestampTest, RoundsMillisecondsUpwardAndStaysInRange) {
-    const Case cases[] = {{Timestamp(0, 2500), Timestamp(0, 1000), 2},
-                          {Timestamp(0, 1000), Timestamp(0, 2700), -1},
-                          {Timestamp(0, 1000), Timestamp(0, 2499), 0},
-                          {Timestamp(0, 0), Timestamp(1, 0), -4294966},
-                          {Timestamp(1000000, 0), Timestamp(), 2147483647},
-                          {Timestamp(), Timestamp(1000000, 0), -2147483647 - 1}};
-    for (const Case& each : cases)
-        EXPECT_EQ(each.a - each.b, each.difference);
-}
-
-TEST_F(TimestampTest, DiffersInMicrosecondsFromItsNeighboursAndReportsOthers) {
-    const Case cases[] = {{Timestamp(7, 5), Timestamp(6, 0xFFFFFFFF), 6},
-                          {Timestamp(6, 0xFFFFFFFF), Timestamp(7, 5), -6},
-                          {Timestamp(1000001, 123), Timestamp(2, 50), -50},
-                          {Timestamp(2, 50), Timestamp(1000001, 123), 50},
-                          // Too far apart:
-                          {Timestamp(10, 0), Timestamp(5, 0), 0},
-                          {Timestamp(1000000, 123), Timestamp(0, 50), 73},
-                          {Timestamp(3, 1), Timestamp(1000001, 0), 1}};
-    for (const Case& each : cases)
-        EXPECT_EQ(each.a.diffInMicrosec(each.b), each.difference);
+TEST_F(TimestampTest, DiffersInMillisecondsAndMicrosecondsAsFarAsTheyReach) {
+    const std::int32_t most = 2147483647;
+    const std::int32_t least = -most - 1;
+    const struct {
+        Timestamp a, b;
+        std::int32_t milliseconds, microseconds;
+    } cases[] = {{Timestamp(0, 2500), Timestamp(0, 1000), 2, 1500},
+                 {Timestamp(0, 1000), Timestamp(0, 2700), -1, -1700},
+                 {Timestamp(0, 1000), Timestamp(0, 2499), 0, -1499},
+                 {Timestamp(7, 5), Timestamp(6, 0xFFFFFFFF), 0, 6},
+                 {Timestamp(6, 0xFFFFFFFF), Timestamp(7, 5), 0, -6},
+                 {Timestamp(1000001, 123), Timestamp(2, 50), most, -50},
+                 {Timestamp(2, 50), Timestamp(1000001, 123), least, 50},
+                 // Too far apart:
+                 {Timestamp(10, 0), Timestamp(5, 0), 21474836, 0},
+                 {Timestamp(1000000, 123), Timestamp(0, 50), most, 73},
+                 {Timestamp(3, 1), Timestamp(1000001, 0), least, 1}};
+    for (const auto& each : cases) {
+        EXPECT_EQ(each.a - each.b, each.milliseconds);
+        EXPECT_EQ(each.a.diffInMicrosec(each.b), each.microseconds);
+    }
     const std::string line = "diffInMicrosecond called with too much difference between arguments";
     EXPECT_EQ(logLines(), Lines(3, "error: " + line));
 }

@@ -24,7 +24,6 @@ std::string describe(const Token& token) {
 
 /// The alternatives of each symbol, which texts name behind a "$"; the first one leads to an end.
 const std::map<char, std::vector<std::string>> rules = {
-    // What the tokenizer reads to its end.
     {'D', {"", "$M", "$M$M$D", "$T$M$D", "$R$T$S$M$D"}},
     {'M',
      {"<$N/>", "<$N$A$S>", "<$N$A$A$A$A/>", "</$N$S>", "<!--$c-->", "<!--$c -x$c-->$T",
@@ -36,15 +35,9 @@ const std::map<char, std::vector<std::string>> rules = {
     {'T', {"", "x", ">", "]]>", "\x01", "\xC3\xA4", "\xFF ", "- ;$T", "text of twenty bytes$T"}},
     {'R',
      {"&amp;", "&lt;", "&gt;", "&apos;", "&quot;", "&$N;", "&#65;", "&#x4aD;",
-      "&#99999999999999999999999;"}},
+      "&#x10000000000000041;"}},
     {'S', {"", " ", "\t", "\r\n", "\n                    "}},
     {'c', {"", "<&", " >\n$c", "comments of twenty bytes$c"}},
-    // Fragments of that in any order.
-    {'F', {"", "$f$F", "<t>$F", "$f$f$f$F"}},
-    {'f', {"<",     ">",   "</",       "/>",        "<a",         "=",    "\"", "'",  "&",
-           "&#",    "&#x", "41",       ";",         "<!--",       "--",   "->", "-",  "<!",
-           "<?xml", "?>",  " version", " encoding", "standalone", "='v'", " ",  "\n", "\x01",
-           "9",     ":",   "x",        "&amp;",     "<a b='c' ",  "<a>"}},
 };
 
 /// Makes the same texts on every machine.
@@ -74,7 +67,8 @@ protected:
     /// Reads a text through buffers that show it whole and in pieces.
     void compare(const std::string& text) {
         expected = pells_test::referenceTokens(text);
-        for (const std::size_t size : {text.size() + 1, 0UL, 1UL, 2UL, 3UL, 7UL}) {
+        const std::size_t sizes[] = {text.size() + 1, 0, 1, 2, 3, 7};
+        for (const std::size_t size : sizes) {
             pells_test::ChunkedBuffer buffer(text, size);
             std::istream in(&buffer);
             XMLTokenizer tokenizer(in);
@@ -101,13 +95,8 @@ TEST_F(TokenizerReference, AgreesOnWellFormedDocuments) {
 }
 
 TEST_F(TokenizerReference, AgreesOnDamagedDocuments) {
-    for (int left = 40000; left > 0 && !HasFailure(); --left)
+    for (int left = 30000; left > 0 && !HasFailure(); --left)
         compare(generator.damaged());
-}
-
-TEST_F(TokenizerReference, AgreesOnFragments) {
-    for (int left = 40000; left > 0 && !HasFailure(); --left)
-        compare(generator.text('F'));
 }
 
 }  // namespace

@@ -22,11 +22,6 @@ char namedEntity(const std::string& name) {
     return known == entities.end() ? '?' : known->second;
 }
 
-char numberedEntity(const std::string& digits, int base) {
-    const unsigned long number = std::strtoul(digits.c_str(), nullptr, base);
-    return static_cast<char>(static_cast<unsigned char>(number));
-}
-
 /// "!" means optional in this parser library, and a function in brackets gets what has matched.
 template <class Position>
 class Grammar {
@@ -48,7 +43,9 @@ private:
     }
     auto setNumber(int base) {
         return [this, base](auto first, auto last) {
-            entity = numberedEntity(std::string(first, last), base);
+            const std::string digits(first, last);
+            const unsigned long number = std::strtoul(digits.c_str(), nullptr, base);
+            entity = static_cast<char>(static_cast<unsigned char>(number));
         };
     }
     auto setToken(Token::TokenType type) {
