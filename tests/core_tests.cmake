@@ -1,6 +1,5 @@
 pells_add_test(core_test SOURCES core_test.cpp)
 pells_add_test(log_test SOURCES log_test.cpp)
 pells_add_test(stream_buffers_test SOURCES stream_buffers_test.cpp)
-pells_add_test(performance_test SOURCES performance_test.cpp)
 pells_add_test(timing_test SOURCES timing_test.cpp)
 include(unload_tests.cmake)

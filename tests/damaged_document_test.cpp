@@ -1,33 +1,24 @@
-// Documents that are cut off or damaged at any byte, and streams that fail there.
+// Documents that are cut off, damaged at any byte or nested without end, and streams that fail.
 
-#include <gtest/gtest.h>
-
-#include <sstream>
-
+#include "support/chunked_buffer.h"
 #include "support/everything.h"
 #include "support/test_prefs.h"
+#include "support/thrown.h"
+
+#if !defined(_WIN32)
+#include <pthread.h>
+#endif
 
 namespace {
 
-const char document[] =
+using pells::InTag;
+using pells_test::Everything;
+
+const std::string document =
     "<root><f>2.5</f><i>-12</i><s>a &lt; b</s><c r='0.5'/><material><ambdiff>1</ambdiff></material>"
-    "<history><steps><step class='CountingStep'><label>one</label></step></steps></history>"
-    "<child class='Everything'><i>2</i><ints><int>7</int></ints></child><!-- end -->"
-    "<matrices><matrix><matrix>1</matrix></matrix></matrices></root>";
-
-/// Gives a text up to some character and then throws.
-class ThrowingBuffer : public std::streambuf {
-public:
-    explicit ThrowingBuffer(std::string readable) : text(std::move(readable)) {
-        setg(&text[0], &text[0], &text[0] + text.size());
-    }
-
-protected:
-    int_type underflow() override { throw std::runtime_error("broken"); }
-
-private:
-    std::string text;
-};
+    "<history><stack><stackItem class='CountingStep'><label>one</label></stackItem></stack>"
+    "</history><child class='Everything'><i>2</i><ints><int>7</int></ints></child><!-- end -->"
+    "<matrices><matrice><matriceItem>1</matriceItem></matrice></matrices></root>";
 
 class DamagedDocument : public pells_test::LibraryTest {
 protected:
@@ -35,58 +26,86 @@ protected:
 
     /// Loads from a stream; returns the message of the exception. The object stays usable.
     static std::string outcome(std::istream& in) {
-        pells_test::Everything object;
-        std::string message;
-        try {
-            pells::XMLTokenizer tokenizer(in);
-            const auto token = tokenizer.getToken();
-            if (token.type == pells::XMLTokenizer::Token::T_OPEN) {
-                pells::OpenTag root(tokenizer, token);
-                object.load(root, nullptr);
-            }
-        } catch (const std::runtime_error& failure) {
-            message = failure.what();
-        }
+        Everything object;
+        const std::string message =
+            pells_test::thrown<std::runtime_error>([&] { pells_test::load(object, in); });
         pells_test::load(object, "<root><u>5</u></root>");
         EXPECT_EQ(object.u, 5u);
         EXPECT_FALSE(pells_test::saved(object).empty());
         return message;
     }
-
-    static std::string outcome(const std::string& text) {
-        std::istringstream in(text);
-        return outcome(in);
-    }
 };
 
-TEST_F(DamagedDocument, CutOffAnywhereEndsTooEarly) {
-    const std::string whole = document;
-    EXPECT_EQ(outcome(whole), "");
-    for (std::size_t size = std::string("<root>").size(); size < whole.size(); ++size)
-        EXPECT_EQ(outcome(whole.substr(0, size)), "Malformed XML: premature EOF") << size;
+TEST_F(DamagedDocument, CutOffAnywhereEndsTooEarlyOrWithTheErrorOfTheStream) {
+    Everything whole;
+    pells_test::load(whole, document);
+    EXPECT_EQ(whole.history.getUndoStackSize(), 1) << "what is cut should be known";
+    for (std::size_t size = std::string("<root>").size(); size <= document.size(); ++size) {
+        const std::string text = document.substr(0, size);
+        for (const char* const wanted : {"Malformed XML: premature EOF", "damaged"}) {
+            pells_test::ChunkedBuffer buffer(text, size % 16, true);
+            std::istream in(&buffer);
+            if (wanted == std::string("damaged"))
+                in.exceptions(std::ios_base::badbit);
+            EXPECT_EQ(outcome(in), size < document.size() ? wanted : "") << "cut at " << size;
+            EXPECT_EQ(in.bad(), size < document.size());
+        }
+    }
 }
 
 TEST_F(DamagedDocument, WithAnyByteChangedFailsOrLoads) {
-    const std::string whole = document;
-    for (std::size_t at = 0; at < whole.size(); ++at) {
+    for (std::size_t at = 0; at < document.size(); ++at) {
         for (const char other :
-             {'<', '>', '&', '"', '\0', '\xFF', static_cast<char>(whole[at] ^ 1)})
-            outcome(whole.substr(0, at) + other + whole.substr(at + 1));
+             {'<', '&', '"', '\0', '\xFF', static_cast<char>(document[at] ^ 1)}) {
+            std::istringstream in(std::string(document).replace(at, 1, 1, other));
+            outcome(in);
+        }
     }
 }
 
-TEST_F(DamagedDocument, FromAStreamThatThrowsEndsThereOrThrows) {
-    const std::string whole = document;
-    for (std::size_t size = std::string("<root>").size(); size < whole.size(); ++size) {
-        ThrowingBuffer quiet(whole.substr(0, size));
-        std::istream silent(&quiet);
-        EXPECT_EQ(outcome(silent), "Malformed XML: premature EOF") << size;
-
-        ThrowingBuffer loud(whole.substr(0, size));
-        std::istream throwing(&loud);
-        throwing.exceptions(std::ios_base::badbit);
-        EXPECT_EQ(outcome(throwing), "broken") << size;
-    }
+/// Loads elements nested so often, with a number behind them; returns why they are refused.
+std::string nestingFailure(Everything& object, const std::string& tag, int depth) {
+    std::string text;
+    for (int i = 0; i < depth; ++i)
+        text += '<' + tag + '>';
+    for (int i = 0; i < depth; ++i)
+        text += "</" + tag.substr(0, tag.find(' ')) + '>';
+    return pells_test::failure(object, "<root>" + text + "<i>5</i></root>");
 }
+
+const char child[] = "child class='Everything'";
+const char tooDeep[] = "Malformed XML: nested too deeply";
+
+TEST_F(DamagedDocument, NestedBeyondTheLimitIsRefusedUnlessItIsSkipped) {
+    const unsigned before = InTag::maximumDepth();
+    InTag::setMaximumDepth(7);
+    Everything object;
+    EXPECT_EQ(nestingFailure(object, child, 6), "");
+    EXPECT_EQ(nestingFailure(object, child, 7), tooDeep);
+    InTag::setMaximumDepth(before);
+    EXPECT_EQ(nestingFailure(object, "unknown-element", 300000), "");
+    EXPECT_EQ(object.i, 5);
+}
+
+#if !defined(_WIN32)
+
+TEST_F(DamagedDocument, NestedInObjectsNeedsNoMoreThanAMegabyteOfStack) {
+    const auto loadToTheLimit = [](void* result) -> void* {
+        Everything object;
+        *static_cast<std::string*>(result) = nestingFailure(object, child, 100000);
+        return nullptr;
+    };
+    pthread_attr_t attributes;
+    pthread_attr_init(&attributes);
+    ASSERT_EQ(pthread_attr_setstacksize(&attributes, 1u << 20), 0);
+    std::string result;
+    pthread_t thread;
+    ASSERT_EQ(pthread_create(&thread, &attributes, loadToTheLimit, &result), 0);
+    pthread_join(thread, nullptr);
+    pthread_attr_destroy(&attributes);
+    EXPECT_EQ(result, tooDeep);
+}
+
+#endif
 
 }  // namespace

@@ -4,88 +4,122 @@
 
 #include <sstream>
 
+#include "support/chunked_buffer.h"
+
 namespace {
 
 using pells::XMLTokenizer;
+using pells_test::ChunkedBuffer;
+typedef XMLTokenizer::Token Token;
 
 /// The debug forms of all tokens of a text, T_EOF excluded, a line each.
 std::string tokensOf(const std::string& text) {
     std::istringstream in(text);
     XMLTokenizer tokenizer(in);
     std::ostringstream out;
-    for (;;) {
-        const XMLTokenizer::Token token = tokenizer.getToken();
-        if (token.type == XMLTokenizer::Token::T_EOF)
-            return out.str();
+    for (Token token = tokenizer.getToken(); token.type != Token::T_EOF;
+         token = tokenizer.getToken())
         out << token << '\n';
-    }
+    in.clear();
+    in.str("<more/>");
+    EXPECT_EQ(tokenizer.getToken().type, Token::T_EOF) << "the end is final";
+    return out.str();
 }
-
-typedef std::pair<std::string, std::string> Example;
 
 const std::string openT = "Token: 2 (T_OPEN) <t>\n";
-const std::string closeT = "Token: 3 (T_CLOSE) </t>\n";
 
-TEST(Tokenizer, ReadsSingleTags) {
-    const Example examples[] = {
-        {"<?xml version=\"1.0\"?>\n<!-- - -->\r\n<r x='1' y=\"2\"/>", "<r x=\"1\" y=\"2\"/>"},
-        {"<?xml\tversion = '1.0' encoding=\"utf-8\"\nstandalone='yes' ?><a/>", "<a/>"},
-        {"<?xml version='' standalone=''?><a />", "<a/>"},
-        {"<-_9 _- = 'x'/>", "<-_9 _-=\"x\"/>"},
-        {"<a x='a&quot;>\"b' y=\"'\n\"/>", "<a x=\"a\">\"b\" y=\"'\n\"/>"},
-        {"<a x='1' x='2'/>", "<a x=\"1\" x=\"2\"/>"}};
-    for (const Example& each : examples)
-        EXPECT_EQ(tokensOf(each.first), "Token: 1 (T_SINGLE) " + each.second + "\n");
-}
-
-TEST(Tokenizer, ReadsTextWithReferencesBetweenTags) {
-    const Example examples[] = {{"1.5", "1.5"},
-                                {"  x y  ", "x y  "},
-                                {"ab<!-- c -->cd", "abcd"},
-                                {"ab <!----> \n cd", "ab cd"},
-                                {"a<?xml version='1'?>b", "ab"},
-                                {"<!--->a--><!--->-->b", "b"},
-                                {"a &lt; b &amp;&amp; c &gt;&apos;&quot;", "a < b && c >'\""},
-                                {"&foo;&LT;&a-9_;", "???"},
-                                {"&#65;&#x41;&#x4a;&#x4A;&#233;", "AAJJ\xE9"},
-                                {"&#256;&#8364;&#x100000042;", {'\0', '\xAC', 'B'}},
-                                {"&#99999999999999999999999999;&#x10000000000000000;", "\xFF\xFF"},
-                                {"\xC3\xA4\x01\x7F]]>", "\xC3\xA4\x01\x7F]]>"}};
-    for (const Example& each : examples) {
-        std::string expected = openT;
-        expected.append("Token: 4 (T_TEXT) \"").append(each.second).append("\"\n");
-        EXPECT_EQ(tokensOf("<t\n>" + each.first + "</t >"), expected + closeT);
-    }
-    EXPECT_EQ(tokensOf("<t> \t\r\n</t>"), openT + closeT);
+TEST(Tokenizer, ReadsTagsAndTextWithReferences) {
+    const std::string single = "1 (T_SINGLE) ";
+    const std::string text = "4 (T_TEXT) ";
+    const std::pair<std::string, std::string> examples[] = {
+        {"<?xml\tversion = '1.0' encoding=\"utf-8\"\nstandalone='yes' ?><a />", single + "<a/>"},
+        {"<-_9 x='a&quot;>\"b' x = \"'\n\"/>", single + "<-_9 x=\"a\">\"b\" x=\"'\n\"/>"},
+        {"  x y  ", text + "\"x y  \""},
+        {"ab <!----> \n cd<?xml version='1'?>e", text + "\"ab cde\""},
+        {"a &lt; b &amp;&amp; c &gt;&apos;&quot;", text + "\"a < b && c >'\"\""},
+        {"&foo;&LT;&quot-9_;", text + "\"???\""},
+        {"&#65;&#x41;&#x4a;&#x4A;&#233;&#8364;", text + "\"AAJJ\xE9\xAC\""},
+        {"&#256;&#x100000042;", text + '"' + '\0' + "B\""},
+        {"&#x10000000000000000;\x01\x7F]]>", text + "\"\xFF\x01\x7F]]>\""}};
+    for (const auto& each : examples)
+        EXPECT_EQ(tokensOf("<t\n>" + each.first + "</t >"),
+                  openT + "Token: " + each.second + "\nToken: 3 (T_CLOSE) </t>\n");
+    EXPECT_EQ(tokensOf("<t> \t\r\n</t>"), openT + "Token: 3 (T_CLOSE) </t>\n");
     EXPECT_EQ(tokensOf("<t>ab&amp;&c</t>"), openT + "Token: 4 (T_TEXT) \"ab&\"\n");
 }
 
 TEST(Tokenizer, EndsAtWhatIsNotInItsDialect) {
-    for (const std::string text : {"<!DOCTYPE x>",
-                                   "<![CDATA[x]]>",
-                                   "<?php x?>",
-                                   "<?xml encoding='x'?>",
-                                   "<?xml version='1' standalone='' encoding=''?>",
-                                   "<?xml version='1'encoding='x'?>",
-                                   "<a b>",
-                                   "<a b=c>",
-                                   "<a b='1'c='2'>",
-                                   "<a b='<'>",
-                                   "<a b='&'>",
-                                   "<a:b/>",
-                                   "<a.b/>",
-                                   "<1/>",
-                                   "< a/>",
-                                   "<a/ >",
-                                   "</t a='1'>",
-                                   "&#;",
-                                   "&#X41;",
-                                   "&lt ",
-                                   "<!-- a -- b -->",
-                                   "<!-- a --->",
-                                   "<!-- a control character far inside \x01 -->",
-                                   "<!---\v-->"})
+    const char* const texts[] = {"<!DOCTYPE x>",   "<![CDATA[x]]>", "<?xml encoding='x'?>",
+                                 "<a b>",          "<a b=c>",       "<a b='<'>",
+                                 "<a b='1'c='2'>", "<a:b/>",        "<a.b/>",
+                                 "<1/>",           "< a/>",         "&#X41;",
+                                 "<!-- a -- b -->"};
+    for (const std::string text : texts)
         EXPECT_EQ(tokensOf("<t>" + text + "<a/>"), openT) << text;
+    EXPECT_EQ(tokensOf("<?xml version=''standalone=''?><a/>"), "");
+}
+
+TEST(TokenizerStream, StandsRightBehindEachTokenForOtherReaders) {
+    // Each line is taken by one call; character data comes with the tag that ends it.
+    const std::string lines[] = {"<?xml version='1.0'?><root a='1'>", " <b/>",
+                                 "text&amp;<!----></b>", "", "<data\n>"};
+    const std::string bytes = "\n <<&\n";
+    std::string text;
+    for (const std::string& line : lines)
+        text += line;
+    text += bytes + "</data>";
+    for (const std::size_t size : {0u, 1u, 2u, 3u, 7u, 16u, 1000u}) {
+        ChunkedBuffer buffer(text, size);
+        std::istream in(&buffer);
+        XMLTokenizer tokenizer(in);
+        EXPECT_FALSE(in.flags() & std::ios_base::skipws);
+        std::size_t position = 0;
+        for (const std::string& line : lines) {
+            EXPECT_EQ(buffer.taken(), position) << "in pieces of " << size;
+            const Token token = tokenizer.getToken();
+            position += line.size();
+            EXPECT_EQ(buffer.taken(), position) << token << " in pieces of " << size;
+        }
+        std::string read(bytes.size(), ' ');
+        in.read(&read[0], static_cast<std::streamsize>(read.size()));
+        EXPECT_EQ(read, bytes);
+        EXPECT_EQ(tokenizer.getToken().value, "data");
+        EXPECT_TRUE(in.good()) << "the end is not met before it is asked for";
+        EXPECT_EQ(tokenizer.getToken().type, Token::T_EOF);
+        EXPECT_EQ(in.rdstate(), std::ios_base::eofbit | std::ios_base::failbit);
+    }
+}
+
+TEST(TokenizerStream, StreamThatIsNotGoodEndsTheTokens) {
+    std::istringstream failed("<a/>");
+    failed.setstate(std::ios_base::failbit);
+    XMLTokenizer fromTheStart(failed);
+    failed.clear();
+    EXPECT_EQ(fromTheStart.getToken().type, Token::T_EOF);
+
+    std::istream without(nullptr);
+    EXPECT_EQ(XMLTokenizer(without).getToken().type, Token::T_EOF);
+
+    std::istringstream strict("<a/>x");
+    strict.exceptions(std::ios_base::failbit);
+    XMLTokenizer thrower(strict);
+    EXPECT_EQ(thrower.getToken().value, "a");
+    EXPECT_THROW(thrower.getToken(), std::ios_base::failure);
+    EXPECT_EQ(thrower.getToken().type, Token::T_EOF);
+}
+
+TEST(Tokens, AreLoggedWhateverTheirTypeAndTheStream) {
+    std::ostringstream out;
+    out << std::hex << std::showbase;
+    Token token;
+    token.value = "v";
+    for (const int type : {0, 5, 16, -1}) {
+        token.type = static_cast<Token::TokenType>(type);
+        out << token << '\n';
+    }
+    EXPECT_EQ(out.str(),
+              "Token: 0 (T_IGNORE) v\nToken: 5 (T_EOF) v\nToken: 16 (**bad**) v\n"
+              "Token: -1 (**bad**) v\n");
 }
 
 }  // namespace

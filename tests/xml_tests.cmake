@@ -1,6 +1,4 @@
 pells_add_test(tokenizer_test SOURCES tokenizer_test.cpp)
-pells_add_test(tokenizer_stream_test SOURCES tokenizer_stream_test.cpp)
 pells_add_test(tokenizer_reference_test
                SOURCES tokenizer_reference_test.cpp support/reference_tokenizer.cpp
-                       support/xml_samples.cpp
                LIBRARIES Boost::headers)

@@ -225,12 +225,12 @@ void tokensOfTinyXml2(std::istream& in, Receiver& receiver) {
 }
 
 void tokensOfSpirit(std::istream& in, Receiver& receiver) {
-    for (Token& token : pells_test::ReferenceTokenizer().tokens(in))
+    for (Token& token : pells_test::referenceTokens(in))
         receiver.take(std::move(token));
 }
 
 void tokensOfSpiritInMemory(std::istream& in, Receiver& receiver) {
-    for (Token& token : pells_test::ReferenceTokenizer().tokens(contents(in)))
+    for (Token& token : pells_test::referenceTokens(contents(in)))
         receiver.take(std::move(token));
 }
 

@@ -2,228 +2,149 @@
 
 #include <boost/spirit/include/classic_chset.hpp>
 #include <boost/spirit/include/classic_core.hpp>
+#include <boost/spirit/include/classic_multi_pass.hpp>
 #include <cstdlib>
+#include <iterator>
+#include <map>
+#include <utility>
 
 namespace pells_test {
 
-namespace classic = boost::spirit::classic;
-using pells::XMLTokenizer;
-
 namespace {
 
-typedef classic::chset<unsigned char> CharSet;
-typedef XMLTokenizer::Token Token;
-
-/// Spirit calls an action with the character or the range that matched; `function` wants a string.
-template <class Function>
-class Action {
-public:
-    explicit Action(Function f) : function(f) {}
-    void operator()(unsigned char c) const { function(std::string(1, static_cast<char>(c))); }
-    template <class Position>
-    void operator()(const Position& first, const Position& last) const {
-        function(std::string(first, last));
-    }
-
-private:
-    Function function;
-};
-
-template <class Function>
-Action<Function> action(Function function) {
-    return Action<Function>(function);
-}
+namespace classic = boost::spirit::classic;
+typedef pells::XMLTokenizer::Token Token;
 
 char namedEntity(const std::string& name) {
-    return name == "amp"    ? '&'
-           : name == "lt"   ? '<'
-           : name == "gt"   ? '>'
-           : name == "apos" ? '\''
-           : name == "quot" ? '"'
-                            : '?';
+    static const std::map<std::string, char> entities = {
+        {"amp", '&'}, {"lt", '<'}, {"gt", '>'}, {"apos", '\''}, {"quot", '"'}};
+    const auto known = entities.find(name);
+    return known == entities.end() ? '?' : known->second;
 }
 
-char numberedEntity(const std::string& digits, int base) {
-    return static_cast<char>(
-        static_cast<unsigned char>(std::strtoul(digits.c_str(), nullptr, base)));
-}
-
-}  // namespace
-
-/// "!" means optional in this parser library.
+/// "!" means optional in this parser library, and a function in brackets gets what has matched.
 template <class Position>
-class ReferenceTokenizer::Grammar {
+class Grammar {
 public:
     Grammar();
 
-    /// The tokens from a position to the end; the last one is T_EOF.
+    /// The tokens from a position to the end.
     std::vector<Token> tokens(Position position, const Position& end);
 
 private:
+    typedef classic::chset<unsigned char> CharSet;
     typedef classic::rule<classic::scanner<Position>> Rule;
 
-    Token next(Position& position, const Position& end);
-
-    void defineValues();
-    void defineMarkup();
-    void defineIgnorable();
-
-    auto appendTo(std::string& buffer) {
-        return action([&buffer](const std::string& matched) { buffer += matched; });
+    static auto appendTo(std::string& buffer) {
+        return [&buffer](auto first, auto last) { buffer.append(first, last); };
     }
     auto appendEntityTo(std::string& buffer) {
-        return action([this, &buffer](const std::string&) { buffer += entity; });
+        return [this, &buffer](auto, auto) { buffer += entity; };
     }
-    auto clear() {
-        return action([this](const std::string&) {
-            token.attrs.clear();
-            name = attributeName = attributeValue = std::string();
-        });
-    }
-    auto addAttribute() {
-        return action([this](const std::string&) {
-            token.attrs.emplace_back(attributeName, attributeValue);
-            attributeName = attributeValue = std::string();
-        });
+    auto setNumber(int base) {
+        return [this, base](auto first, auto last) {
+            const std::string digits(first, last);
+            const unsigned long number = std::strtoul(digits.c_str(), nullptr, base);
+            entity = static_cast<char>(static_cast<unsigned char>(number));
+        };
     }
     auto setToken(Token::TokenType type) {
-        return action([this, type](const std::string&) {
+        return [this, type](auto, auto) {
             token.type = type;
-            token.value = name;
-            name.clear();
-        });
+            token.value = std::exchange(name, {});
+        };
     }
 
     Token token;
     std::string name;
-    std::string attributeName;
-    std::string attributeValue;
+    Token::Attribute scratch;
     char entity = 0;
-
-    Rule space, equals, identifier, comment, misc;
-    Rule entityRef, charRef, reference, attValue, attribute;
-    Rule startTag, emptyTag, endTag, charData;
-    Rule versionInfo, encodingDecl, standaloneDecl, declaration, ignorable, markup, any;
+    Rule space, equals, identifier, reference, value, attribute;
+    Rule tag, endTag, text, markup, comment, declaration, any;
 };
 
 template <class Position>
-ReferenceTokenizer::Grammar<Position>::Grammar() {
-    defineValues();
-    defineMarkup();
-    defineIgnorable();
-    any = ignorable | markup;
-}
-
-template <class Position>
-void ReferenceTokenizer::Grammar<Position>::defineValues() {
+Grammar<Position>::Grammar() {
     using namespace classic;
-    const CharSet nameStart("A-Za-z_-");  // a "-" at the end stands for itself
-    const CharSet nameChar("A-Za-z0-9_-");
     const CharSet inDoubleQuotes(~CharSet("<&\""));
     const CharSet inApostrophes(~CharSet("<&'"));
+    const auto setNamed = [this](auto first, auto last) {
+        entity = namedEntity(std::string(first, last));
+    };
+    const auto appendChar = appendTo(scratch.second);
+    const auto appendEntity = appendEntityTo(scratch.second);
 
     space = +CharSet("\t\n\r ");
     equals = !space >> '=' >> !space;
-    identifier = nameStart >> *nameChar;
-    entityRef =
-        '&' >> identifier[action([this](const std::string& n) { entity = namedEntity(n); })] >> ';';
-    charRef =
-        (str_p("&#") >>
-         (+CharSet(
-             "0-9"))[action([this](const std::string& d) { entity = numberedEntity(d, 10); })] >>
-         ';') |
-        (str_p("&#x") >> (+CharSet("0-9a-fA-F"))[action(
-                             [this](const std::string& d) { entity = numberedEntity(d, 16); })] >>
-         ';');
-    reference = entityRef | charRef;
-    attValue =
-        ('"' >>
-         *(inDoubleQuotes[appendTo(attributeValue)] | reference[appendEntityTo(attributeValue)]) >>
-         '"') |
-        ('\'' >>
-         *(inApostrophes[appendTo(attributeValue)] | reference[appendEntityTo(attributeValue)]) >>
-         '\'');
+    identifier = CharSet("A-Za-z_-") >> *CharSet("A-Za-z0-9_-");  // a "-" at the end is itself
+    reference = ('&' >> identifier[setNamed] >> ';') |
+                ("&#" >> (+CharSet("0-9"))[setNumber(10)] >> ';') |
+                ("&#x" >> (+CharSet("0-9a-fA-F"))[setNumber(16)] >> ';');
+    value = ('"' >> *((+inDoubleQuotes)[appendChar] | reference[appendEntity]) >> '"') |
+            ('\'' >> *((+inApostrophes)[appendChar] | reference[appendEntity]) >> '\'');
+
+    const auto clear = [this](auto, auto) {
+        token.attrs.clear();
+        name.clear();
+        scratch = {};
+    };
+    const auto addAttribute = [this](auto, auto) {
+        token.attrs.push_back(std::exchange(scratch, {}));
+    };
+
+    attribute = identifier[appendTo(scratch.first)] >> equals >> value;
+    tag = str_p("<")[clear] >> identifier[appendTo(name)] >> *(space >> attribute[addAttribute]) >>
+          !space;
+    endTag = "</" >> identifier[appendTo(name)] >> !space >> '>';
+    text = +((+~CharSet("<&"))[appendTo(name)] | reference[appendEntityTo(name)]);
+    markup = (tag >> '>')[setToken(Token::T_OPEN)] | endTag[setToken(Token::T_CLOSE)] |
+             (tag >> "/>")[setToken(Token::T_SINGLE)] | text[setToken(Token::T_TEXT)];
+
+    const CharSet noHyphen(CharSet("\t\n\r ") | range<unsigned char>(0x21, '-' - 1) |
+                           range<unsigned char>('-' + 1, 0xFF));
+    const auto assignment = [this](const char* wanted) {
+        return space >> wanted >> equals >> value;
+    };
+
+    comment = "<!--" >> *(noHyphen | ('-' >> noHyphen)) >> "-->";
+    declaration = "<?xml" >> assignment("version") >> !assignment("encoding") >>
+                  !assignment("standalone") >> !space >> "?>";
+    any = declaration | comment | space | markup;
 }
 
 template <class Position>
-void ReferenceTokenizer::Grammar<Position>::defineMarkup() {
-    using namespace classic;
-    const CharSet textChar(~CharSet("<&"));
-
-    attribute = identifier[appendTo(attributeName)] >> equals >> attValue;
-    startTag = ch_p('<')[clear()] >> identifier[appendTo(name)] >>
-               *(space >> attribute[addAttribute()]) >> !space >> '>';
-    emptyTag = ch_p('<')[clear()] >> identifier[appendTo(name)] >>
-               *(space >> attribute[addAttribute()]) >> !space >> "/>";
-    endTag = str_p("</") >> identifier[appendTo(name)] >> !space >> '>';
-    charData = +((+textChar)[appendTo(name)] | reference[appendEntityTo(name)]);
-    markup = startTag[setToken(Token::T_OPEN)] | endTag[setToken(Token::T_CLOSE)] |
-             emptyTag[setToken(Token::T_SINGLE)] | charData[setToken(Token::T_TEXT)];
-}
-
-template <class Position>
-void ReferenceTokenizer::Grammar<Position>::defineIgnorable() {
-    using namespace classic;
-    const CharSet commentChar(CharSet("\t\n\r ") | range<unsigned char>(0x21, 0xFF));
-
-    comment = str_p("<!--") >> *((commentChar - '-') | ('-' >> (commentChar - '-'))) >> "-->";
-    misc = comment | space;
-    versionInfo = space >> "version" >> equals >> attValue;
-    encodingDecl = space >> "encoding" >> equals >> attValue;
-    standaloneDecl = space >> "standalone" >> equals >> attValue;
-    declaration =
-        str_p("<?xml") >> versionInfo >> !encodingDecl >> !standaloneDecl >> !space >> "?>";
-    ignorable = declaration | misc;
-}
-
-template <class Position>
-Token ReferenceTokenizer::Grammar<Position>::next(Position& position, const Position& end) {
-    do {
+std::vector<Token> Grammar<Position>::tokens(Position position, const Position& end) {
+    name.clear();
+    std::vector<Token> found;
+    for (bool hit = true; hit;) {
         token = Token();
         const classic::parse_info<Position> result = classic::parse(position, end, any);
-        if (!result.hit) {
-            // Attributes of a tag that broke off are nobody's.
-            token = Token();
-            token.type = Token::T_EOF;
-            return token;
-        }
         position = result.stop;
-    } while (token.type == Token::T_IGNORE);
-    return token;
-}
-
-template <class Position>
-std::vector<Token> ReferenceTokenizer::Grammar<Position>::tokens(Position position,
-                                                                 const Position& end) {
-    name = attributeName = attributeValue = std::string();
-    std::vector<Token> found;
-    do {
-        Token read = next(position, end);
-        const bool continues =
-            read.type == Token::T_TEXT && !found.empty() && found.back().type == Token::T_TEXT;
-        if (continues)
-            found.back().value += read.value;
-        else
-            found.push_back(std::move(read));
-    } while (found.back().type != Token::T_EOF);
+        hit = result.hit;
+        if (token.type == Token::T_TEXT && !found.empty() && found.back().type == Token::T_TEXT)
+            found.back().value += token.value;
+        else if (hit && token.type != Token::T_IGNORE)
+            found.push_back(token);
+    }
+    found.emplace_back().type = Token::T_EOF;
     return found;
 }
 
-ReferenceTokenizer::ReferenceTokenizer()
-    : inMemory(std::make_unique<Grammar<InMemory>>()),
-      inStream(std::make_unique<Grammar<InStream>>()) {}
+}  // namespace
 
-ReferenceTokenizer::~ReferenceTokenizer() = default;
-
-std::vector<Token> ReferenceTokenizer::tokens(const std::string& text) {
-    const InMemory first = reinterpret_cast<InMemory>(text.data());
-    return inMemory->tokens(first, first + text.size());
+std::vector<Token> referenceTokens(const std::string& text) {
+    typedef const unsigned char* Position;
+    static Grammar<Position> grammar;
+    const Position first = reinterpret_cast<Position>(text.data());
+    return grammar.tokens(first, first + text.size());
 }
 
-std::vector<Token> ReferenceTokenizer::tokens(std::istream& in) {
+std::vector<Token> referenceTokens(std::istream& in) {
+    typedef std::istream_iterator<unsigned char> Character;
+    typedef classic::multi_pass<Character> Position;
+    static Grammar<Position> grammar;
     in.unsetf(std::ios_base::skipws);
-    const std::istream_iterator<unsigned char> first(in);
-    return inStream->tokens(InStream(first), InStream(std::istream_iterator<unsigned char>()));
+    return grammar.tokens(Position(Character(in)), Position(Character()));
 }
 
 }  // namespace pells_test
