@@ -106,9 +106,10 @@ void addDocuments() {
     addDocument("unknown names", 10000, "<root>", "<u*/>", "</root>");
     addDocument("one member again and again", 1000, "<root>", "<child class='Everything'/>",
                 "</root>");
-    addDocument("entries", 10000, "<root><words>", "<e>word *</e>", "</words></root>");
-    addDocument("steps", 1000, "<root><history><steps>",
-                "<step class='CountingStep'><label>*</label></step>", "</steps></history></root>");
+    addDocument("entries", 10000, "<root><words>", "<word>text *</word>", "</words></root>");
+    addDocument("steps", 1000, "<root><history><stack>",
+                "<stackItem class='CountingStep'><label>*</label></stackItem>",
+                "</stack></history></root>");
 }
 
 void addPictures() {

@@ -20,9 +20,10 @@ namespace {
 const char document[] =
     "<root><f>2.5</f><s>text longer than a short string</s><c r='0.5'/>"
     "<material><texname>Textures/some/long/name.tga</texname></material>"
-    "<history><steps><step class='CountingStep'><label>the first of two steps</label></step>"
-    "<step class='CountingStep'/></steps></history><child class='Everything'><i>2</i></child>"
-    "<matrices><matrix><matrix>1</matrix></matrix></matrices></root>";
+    "<history><stack><stackItem class='CountingStep'><label>the first of two "
+    "steps</label></stackItem>"
+    "<stackItem class='CountingStep'/></stack></history><child class='Everything'><i>2</i></child>"
+    "<matrices><matrice><matriceItem>1</matriceItem></matrice></matrices></root>";
 
 class AllocationFailure : public pells_test::AssetRootTest {
 protected:
@@ -55,6 +56,8 @@ TEST_F(AllocationFailure, WhileADocumentLoads) {
     expectRecovery([] {
         pells_test::Everything object;
         pells_test::load(object, document);
+        EXPECT_EQ(object.history.getUndoStackSize(), 2);
+        EXPECT_EQ(object.matrices.size(), 1u);
         return pells_test::saved(object);
     });
 }
