@@ -73,6 +73,36 @@ TEST_F(AliasTest, LinksOfTheFileSystemAreFollowedButNeverInCircles) {
               (Lines{"''", "'a'", "'a/b'", "'a/c'", "'here'"}));
 }
 
+TEST_F(AliasTest, LinksOfTheFileSystemThatCrossEndTheSearchWithOneLine) {
+    // Ten folders with links to one another: ten factorial ways through them, none of them
+    // circular.
+    for (char from = '0'; from <= '9'; ++from) {
+        for (char to = '0'; to <= '9'; ++to) {
+            fs::create_directories(std::string("root/") + to);
+            if (from != to)
+                fs::create_directory_symlink(std::string("../") + to,
+                                             std::string("root/") + from + '/' + to);
+        }
+    }
+    write("7/.symlinks", "y>x");
+    write("7/x", "x");
+    prefs()["log"] = "error -asset";
+    pells::AssetManager::setAliasLimit(10000);
+    EXPECT_EQ(aliasOf("7/y"), "7/x");
+    EXPECT_EQ(logLines("error: Too many folders behind links of the file system").size(), 1u);
+}
+
+TEST_F(AliasTest, NamesInArchivesLeadTheSearchOutOfTheRootNeither) {
+    scratch.write(".symlinks", "here>beside");
+    scratch.write("beside/.symlinks", "n>m");
+    scratch.write("beside/m", "m");
+    writeArchive("a.asset", {{"../a/.symlinks", "c>b"}, {"../a/b", "b"}, {"d/../../beside/e", ""}});
+    EXPECT_EQ(aliasOf("../a/c"), "../a/b");
+    EXPECT_EQ(aliasOf("../beside/n") + aliasOf("d/../../beside/n"), "");
+    EXPECT_EQ(sorted(logLines("asset.alias: Making new DirNode for ")),
+              (Lines{"''", "'..'", "'../a'", "'d'", "'d/..'", "'d/../..'", "'d/../../beside'"}));
+}
+
 // What strangers may declare: each of these would take hours or all memory.
 TEST_F(AliasTest, StopAtTheLimitWhereLinksDoubleWithEveryLevel) {
     prefs()["log"] = "error";

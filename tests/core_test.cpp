@@ -36,6 +36,7 @@ TEST(Singletons, AreFreedOnceNewestFirstThoseMadeMeanwhileIncluded) {
     EXPECT_EQ(&Tracked<'X'>::instance(), &x);
     Stubborn stays;
     SingletonList::addSingleton(&stays);
+    SingletonList::addSingleton(&stays);
     Tracked<'Y'>::instance();
     Tracked<'Z'>::instance();
     delete Tracked<'X'>::singleton;

@@ -36,6 +36,7 @@ TEST(OutputBuffer, WritesABlockWhenItsLastCharacterArrives) {
     out << 'b';
     EXPECT_EQ(buffer.blocks, std::vector<std::string>{std::string(1023, 'a') + 'b'});
     out << 'c';
+    EXPECT_EQ(buffer.sputn("d", -1), 0) << "as standard buffers do";
     EXPECT_EQ(buffer.close(), 0);
     EXPECT_EQ(buffer.blocks.back(), "c");
     EXPECT_EQ(buffer.syncs, 2);

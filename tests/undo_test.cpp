@@ -214,6 +214,18 @@ TEST_F(UndoTest, SavesTheDoneAndValidStepsAndReplaysThemOnLoad) {
     EXPECT_EQ(stateOf(copy), "abc|");
 }
 
+TEST_F(UndoTest, IsEmptyOnceLoadingHasDroppedEveryStep) {
+    record("a");
+    last().name = "A";
+    load(history, "<h><stack/></h>");
+    EXPECT_EQ(takeJournal(), "destroy A, ");
+    EXPECT_EQ(stateOf(history), "|");
+    EXPECT_FALSE(history.undo() || history.redo() || history.getLast());
+    EXPECT_EQ(saved(history), "");
+    record("b");
+    EXPECT_EQ(stateOf(history), "b|");
+}
+
 TEST_F(UndoTest, KeepsWholeStepsOfADocumentCutAnywhere) {
     const std::string end = "</stackItem>";
     for (std::size_t cut = 7; cut < twoSteps.size() && !HasFailure(); ++cut) {
