@@ -41,8 +41,9 @@ extern template class PELLS_API Singleton<AssetManager, SingletonFactory<AssetMa
 /// gives the file or child folder TARGET of that folder a second name there, LINK; below a folder,
 /// everything gets one. Lines that begin with "#" are comments; other lines are reported under
 /// "asset.alias". Nothing is trimmed, so "a > b" names "a " and " b". Folders named "CVS" and
-/// ".svn", folders that links of the file system lead back to, and folders more than 256 levels
-/// down are not searched, and there is a limit on the number of aliases.
+/// ".svn", folders that links of the file system lead back to, folders that ".." in the name of a
+/// member would lead to, and folders more than 256 levels down are not searched, and there is a
+/// limit on the number of aliases.
 ///
 /// The constructor throws boost::filesystem::filesystem_error when the root cannot be listed and
 /// what reading a damaged ".symlinks" member throws; the next instance() tries again. One thread
@@ -107,7 +108,8 @@ public:
 
     /// The largest number of aliases, 1,000,000 unless it was set. Where the ".symlinks" files
     /// declare more, the rest is dropped with one line under "error". The text of those files and
-    /// of the names is limited in proportion.
+    /// of the names is limited in proportion, and so is the number of folders that are searched
+    /// behind links of the file system: 1,000 and a fiftieth of this.
     static std::size_t getAliasLimit();
 
     /// Takes effect when the next manager is made.
