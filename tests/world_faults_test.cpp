@@ -45,6 +45,17 @@ TEST_F(WorldFaults, AFullDiskSilencesTheLogFileOnly) {
     EXPECT_TRUE(debugger.has("app: the last line\n"));
 }
 
+TEST_F(WorldFaults, AWorkingDirectoryThatIsGoneSilencesTheLogFileOnly) {
+    prefs()["assetLocation"] = scratch.path("root");
+    writeArchive("a.asset", {{"name", "content"}});
+    fs::create_directory("gone");
+    fs::current_path("gone");
+    fs::remove(scratch.path("gone"));
+    EXPECT_EQ(read("name"), "content");
+    pells::Log::instance().close();
+    EXPECT_TRUE(debugger.has("asset.open: "));
+}
+
 TEST_F(WorldFaults, FilesThatVanishOrChangeHarmNoOther) {
     writeArchive("cut.asset", {{"long", noise(400000)}, {"newer", "old"}}, 1000);
     writeArchive("other.asset", {{"other", "fine"}});
