@@ -41,15 +41,15 @@ std::string withBackslashes(std::string name) {
 void readMembers(pells::pellistream& archive) {
     const std::vector<std::string> names(archive.begin(), archive.end());
     for (std::size_t at = 0; at < std::min(names.size(), mostMembers); ++at) {
-        const std::string content = contentOf(archive, names[at], 5000);
-        pells_fuzz::require(contentOf(archive, names[at], 5000) == content, "reads the same again");
+        const std::string content = contentOf(archive, names[at], 2000);
+        pells_fuzz::require(contentOf(archive, names[at], 2000) == content, "reads the same again");
         // Of data that is cut off, how much comes out depends on where the reader's pieces end.
         const std::string slowly = contentOf(archive, names[at], 7);
         const std::size_t both = std::min(content.size(), slowly.size());
         pells_fuzz::require(content.compare(0, both, slowly, 0, both) == 0,
                             "reads the same in small pieces");
         if (names[at].find('\\') == std::string::npos)
-            contentOf(archive, withBackslashes(names[at]), 5000);
+            contentOf(archive, withBackslashes(names[at]), 2000);
     }
 }
 

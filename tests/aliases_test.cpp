@@ -92,7 +92,7 @@ TEST_F(AliasTest, LinksOfTheFileSystemThatCrossEndTheSearchWithOneLine) {
     EXPECT_EQ(logLines("error: Too many folders behind links of the file system").size(), 1u);
 }
 
-TEST_F(AliasTest, NamesInArchivesLeadTheSearchOutOfTheRootNeither) {
+TEST_F(AliasTest, NamesInArchivesDoNotLeadTheSearchOutOfTheRoot) {
     scratch.write(".symlinks", "here>beside");
     scratch.write("beside/.symlinks", "n>m");
     scratch.write("beside/m", "m");
