@@ -125,7 +125,9 @@ TEST_F(AliasTest, StopAtTheLimitAndAtDeepFoldersAndEndlessLines) {
     std::string deep;
     for (int depth = 0; depth < 100000; ++depth)
         deep += "d/";
-    const std::string links = "4>f\n3>f\n2>f\n1>f\n" + std::string(30000000, '>') + "\n0>f\n";
+    std::string links = "4>f\n3>f\n2>f\n1>f\n";
+    links.resize(30000000, '>');
+    links += "\n0>f\n";
     writeArchive("a.asset", {{deep + "x", "x"}, {"f", "f"}, {".symlinks", links}});
     EXPECT_EQ(read(deep + "x"), "x");
     EXPECT_EQ(aliasOf("0"), "") << "behind the endless line";

@@ -27,7 +27,7 @@ protected:
     /// Loads from a stream; returns the message of the exception. The object stays usable.
     static std::string outcome(std::istream& in) {
         Everything object;
-        const std::string message =
+        std::string message =
             pells_test::thrown<std::runtime_error>([&] { pells_test::load(object, in); });
         pells_test::load(object, "<root><u>5</u></root>");
         EXPECT_EQ(object.u, 5u);
