@@ -1,3 +1,4 @@
+#include <cstdint>
 #include <string>
 #include <utility>
 
@@ -27,39 +28,70 @@ XMLTokenizer::Token nextToken(XMLTokenizer& tokenizer) {
 ///
 /// They would each be an IgnoreField that reads its content through a tag of its own; this list is
 /// all that such a tag knows, so that nesting costs no stack, and a level of it no more memory than
-/// its name and one byte. That byte, which occurs in no name, comes before the name and keeps
-/// whether the element around it has warned.
+/// its name and, unless that is long, one byte. Behind each name stands its length, and whether the
+/// element around it has warned, as a number that is read from its end: the innermost name is
+/// found at once, however long the names around it are.
 class OpenTag::SkippedElements {
 public:
     bool empty() const { return names.empty(); }
 
-    std::string innermost() const { return names.substr(start); }
+    std::string innermost() const { return names.substr(start, length); }
 
     bool isInnermost(const std::string& name) const {
-        return names.compare(start, std::string::npos, name) == 0;
+        return names.compare(start, length, name) == 0;
     }
 
     void open(const std::string& name, bool outerHasWarned) {
-        names += outerHasWarned ? hasWarned : hasNot;
         start = names.size();
+        length = name.size();
+        hasOuterWarned = outerHasWarned;
         names += name;
+        appendNumber(2 * std::uint64_t{length} + (outerHasWarned ? 1 : 0));
     }
 
     /// \return what open() was told about the element around the one that is closed.
     bool close() {
-        const bool outerHasWarned = names[start - 1] == hasWarned;
-        names.resize(start - 1);
-        start = names.empty() ? 0 : names.find_last_of(marks) + 1;
+        const bool outerHasWarned = hasOuterWarned;
+        names.resize(start);
+        if (!names.empty())
+            findInnermost();
         return outerHasWarned;
     }
 
 private:
-    static constexpr char hasNot = '<';
-    static constexpr char hasWarned = '!';
-    static constexpr char marks[] = {hasNot, hasWarned, 0};
+    static constexpr unsigned digitBits = 7;
+    static constexpr unsigned digitMask = (1U << digitBits) - 1;
+    /// Marks a digit that others stand before.
+    static constexpr unsigned hasHigher = 1U << digitBits;
+
+    void appendNumber(std::uint64_t number) {
+        unsigned shift = 0;
+        while (number >> shift > digitMask)
+            shift += digitBits;
+        for (unsigned higher = 0;; shift -= digitBits, higher = hasHigher) {
+            names += static_cast<char>((number >> shift & digitMask) | higher);
+            if (shift == 0)
+                return;
+        }
+    }
+
+    void findInnermost() {
+        std::uint64_t number = 0;
+        std::string::size_type at = names.size();
+        unsigned digit = hasHigher;
+        for (unsigned shift = 0; (digit & hasHigher) != 0; shift += digitBits) {
+            digit = static_cast<unsigned char>(names[--at]);
+            number |= std::uint64_t{digit & digitMask} << shift;
+        }
+        hasOuterWarned = (number & 1) != 0;
+        length = static_cast<std::string::size_type>(number / 2);
+        start = at - length;
+    }
 
     std::string names;
     std::string::size_type start = 0;
+    std::string::size_type length = 0;
+    bool hasOuterWarned = false;
 };
 
 void OpenTag::parseContents(Serializable* obj, const ClassDesc& desc) {
