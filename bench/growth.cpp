@@ -104,19 +104,91 @@ void addDocuments() {
     addDocument("nested known elements", 10000, "<root>", "<child class='Everything'>", "",
                 "Malformed XML: nested too deeply");
     addDocument("unknown names", 10000, "<root>", "<u*/>", "</root>");
+    addWork("children of an unknown element with a long name", 10000, [](std::int64_t size) {
+        const std::string name(static_cast<std::size_t>(size), 'n');
+        const std::string text =
+            "<root><" + name + '>' + repeated("<u></u>", size) + "</" + name + "><i>1</i></root>";
+        return [text] {
+            pells_test::Everything object;
+            return pells_test::failure(object, text).empty() && object.i == 1;
+        };
+    });
     addDocument("one member again and again", 1000, "<root>", "<child class='Everything'/>",
                 "</root>");
     addDocument("entries", 10000, "<root><words>", "<word>text *</word>", "</words></root>");
+    addDocument("invalid steps", 1000, "<root><history><stack>",
+                "<stackItem class='CountingStep'><label>*</label></stackItem>"
+                "<stackItem class='CountingStep'><label>invalid</label></stackItem>",
+                "</stack></history></root>");
     addDocument("steps", 1000, "<root><history><stack>",
                 "<stackItem class='CountingStep'><label>*</label></stackItem>",
                 "</stack></history></root>");
+}
+
+/// A history of so many steps, of which every second one is done and every fourth one is invalid.
+pells::UndoRedoSequence historyOf(std::int64_t size) {
+    pells::UndoRedoSequence history;
+    for (std::int64_t i = 0; i < size; ++i) {
+        const boost::intrusive_ptr<pells_test::CountingStep> step(new pells_test::CountingStep);
+        step->label = i % 4 == 1 ? "invalid" : "";
+        if (i < size / 2)
+            history.addUndoable(step);
+        else
+            history.addRedoable(step);
+    }
+    return history;
+}
+
+/// Selects a step, or goes on until it does, by its place.
+class CountDown : public pells::UndoRedoSequence::BatchMethod {
+public:
+    explicit CountDown(std::int64_t steps) : left(steps) {}
+    bool operator()(boost::intrusive_ptr<pells::UndoableStep> /*step*/) const override {
+        return --left == 0;
+    }
+
+private:
+    mutable std::int64_t left;
+};
+
+void addHistories() {
+    typedef pells::UndoRedoSequence History;
+    const std::pair<const char*, bool (*)(History&, std::int64_t)> works[] = {
+        {"saving a history",
+         [](History& history, std::int64_t /*size*/) {
+             return pells_test::saved(history).find("invalid") == std::string::npos;
+         }},
+        {"removing the last step",
+         [](History& history, std::int64_t size) { return history.removeIf(CountDown(size)); }},
+        {"visiting the last step",
+         [](History& history, std::int64_t size) {
+             return !history.applyToAll(CountDown(size), false);
+         }},
+        {"merging histories",
+         [](History& history, std::int64_t size) {
+             History taken = history;
+             history.merge(&taken, pells::IdHandler());
+             return history.getUndoStackSize() == size / 2 * 2;
+         }},
+        {"discarding undone steps", [](History& history, std::int64_t size) {
+             history.addUndoable(history.getLast());
+             return history.getUndoStackSize() == size / 2 + 1;
+         }}};
+    for (const auto& work : works) {
+        addWork(work.first, 2000, [run = work.second](std::int64_t size) {
+            return [run, size, original = historyOf(size)] {
+                History history = original;
+                return run(history, size);
+            };
+        });
+    }
 }
 
 void addPictures() {
     for (const int depth : {8, 32}) {
         addWork("claimed picture/" + std::to_string(depth) + " bits", 4000,
                 [depth](std::int64_t size) {
-                    const std::string file = pells_test::tgaHeader(65535, 65535, depth) +
+                    const std::string file = pells_test::tgaHeader(16384, 16384, depth) +
                                              std::string(static_cast<std::size_t>(size), 'x');
                     return [file] {
                         std::istringstream in(file);
@@ -259,6 +331,7 @@ void addBenchmarks() {
     mallopt(M_MMAP_MAX, 0);
     mallopt(M_TRIM_THRESHOLD, INT_MAX);
     addDocuments();
+    addHistories();
     addPictures();
     addArchives();
     addTrees();

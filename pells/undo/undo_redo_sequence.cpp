@@ -13,6 +13,33 @@ namespace {
 const int nothingHeld = -2;
 const int allUndone = -1;
 
+typedef std::vector<boost::intrusive_ptr<UndoableStep>> Steps;
+
+/// Removes the steps that are not valid, asking them from the last to the first.
+///
+/// \param drop called with each of them. What it or a step throws passes through; the steps that
+///             were not asked by then stay.
+template <class Drop>
+void removeInvalid(Steps& steps, Drop drop) {
+    // The steps that stay move to the end, over a gap of those that do not.
+    struct Gap {
+        ~Gap() { steps.erase(first, last); }
+        Steps& steps;
+        Steps::iterator first;
+        Steps::iterator last;
+    } gap{steps, steps.end(), steps.end()};
+    while (gap.first != steps.begin()) {
+        boost::intrusive_ptr<UndoableStep>& step = *(gap.first - 1);
+        if (!step->isValid())
+            drop(*step);
+        else if (gap.first == gap.last)
+            --gap.last;
+        else
+            (--gap.last)->swap(step);
+        --gap.first;
+    }
+}
+
 }  // namespace
 
 UndoRedoSequence::BatchMethod::~BatchMethod() = default;
@@ -104,11 +131,7 @@ void UndoRedoSequence::save(OutTag& tag) {
     } restore{steps, steps};
 
     steps.resize(static_cast<Steps::size_type>(getUndoStackSize()));
-    for (auto step = steps.end(); step != steps.begin();) {
-        --step;
-        if (!(*step)->isValid())
-            step = steps.erase(step);
-    }
+    removeInvalid(steps, [](const UndoableStep& /*step*/) {});
     Serializable::save(tag);
 }
 
@@ -126,13 +149,7 @@ void UndoRedoSequence::load(InTag& tag, boost::intrusive_ptr<Field> field) {
 }
 
 void UndoRedoSequence::acceptLoadedSteps() {
-    for (auto step = steps.end(); step != steps.begin();) {
-        --step;
-        if (!(*step)->isValid()) {
-            (*step)->destroy();
-            step = steps.erase(step);
-        }
-    }
+    removeInvalid(steps, [](const UndoableStep& step) { step.destroy(); });
     if (!steps.empty())
         current = static_cast<int>(steps.size()) - 1;
     else if (current > allUndone)
