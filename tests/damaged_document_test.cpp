@@ -11,8 +11,10 @@
 
 namespace {
 
+using boost::intrusive_ptr;
 using pells::InTag;
-using pells_test::Everything;
+using pells::Serializable;
+using namespace pells_test;
 
 const std::string document =
     "<root><f>2.5</f><i>-12</i><s>a &lt; b</s><c r='0.5'/><material><ambdiff>1</ambdiff></material>"
@@ -27,8 +29,7 @@ protected:
     /// Loads from a stream; returns the message of the exception. The object stays usable.
     static std::string outcome(std::istream& in) {
         Everything object;
-        std::string message =
-            pells_test::thrown<std::runtime_error>([&] { pells_test::load(object, in); });
+        std::string message = thrown<std::runtime_error>([&] { pells_test::load(object, in); });
         pells_test::load(object, "<root><u>5</u></root>");
         EXPECT_EQ(object.u, 5u);
         EXPECT_FALSE(pells_test::saved(object).empty());
@@ -70,7 +71,7 @@ std::string nestingFailure(Everything& object, const std::string& tag, int depth
         text += '<' + tag + '>';
     for (int i = 0; i < depth; ++i)
         text += "</" + tag.substr(0, tag.find(' ')) + '>';
-    return pells_test::failure(object, "<root>" + text + "<i>5</i></root>");
+    return failure(object, "<root>" + text + "<i>5</i></root>");
 }
 
 const char child[] = "child class='Everything'";
@@ -85,6 +86,67 @@ TEST_F(DamagedDocument, NestedBeyondTheLimitIsRefusedUnlessItIsSkipped) {
     InTag::setMaximumDepth(before);
     EXPECT_EQ(nestingFailure(object, "unknown-element", 300000), "");
     EXPECT_EQ(object.i, 5);
+}
+
+/// An object so deep, with a text or a colour as its innermost element.
+intrusive_ptr<Everything> nested(unsigned depth, bool inVectors) {
+    intrusive_ptr<Everything> object(new Everything);
+    for (unsigned level = 1; level < depth; ++level) {
+        const intrusive_ptr<Everything> outer(new Everything);
+        if (inVectors)
+            outer->children.push_back(object);
+        else
+            outer->child = object;
+        object = outer;
+    }
+    return object;
+}
+
+// What is saved can be loaded, and what could not be loaded is not saved.
+TEST_F(DamagedDocument, IsRefusedAtSavingWhereLoadingWouldRefuseIt) {
+    const unsigned before = InTag::maximumDepth();
+    int refused = 0;
+    for (const bool inVectors : {false, true}) {
+        for (unsigned limit = 1; limit < 12; ++limit) {
+            InTag::setMaximumDepth(before);
+            const intrusive_ptr<Everything> object = nested(4, inVectors);
+            const std::string whole = saved(*object);
+            InTag::setMaximumDepth(limit);
+            Everything copy;
+            const bool loads = failure(copy, whole).empty();
+            const std::string reason = thrown<Serializable::SaveFail>([&] { saved(*object); });
+            EXPECT_EQ(reason.empty(), loads) << limit << ' ' << reason;
+            refused += loads ? 0 : 1;
+        }
+    }
+    EXPECT_EQ(refused, 5 + 8) << "the texts of materials are the deepest";
+    InTag::setMaximumDepth(before);
+
+    const intrusive_ptr<Everything> circle(new Everything);
+    circle->child = circle;
+    std::string path = "root";
+    for (unsigned depth = 2; depth < before; ++depth)
+        path += "/child";
+    EXPECT_EQ(thrown<Serializable::SaveFail>([&] { saved(*circle); }),
+              "Nested too deeply to be loaded: " + path + "/material/shininess");
+    circle->child = nullptr;
+}
+
+TEST_F(DamagedDocument, LargerThanTheLimitIsRefusedFromItsRootOn) {
+    const std::uint64_t before = InTag::maximumDocumentSize();
+    const std::string content = "<words><word>x</word></words></root>";
+    InTag::setMaximumDocumentSize(content.size());
+    Everything object;
+    std::istringstream two("<root>" + content + "<root>" + content);
+    pells::XMLTokenizer tokenizer(two);
+    for (int i = 0; i < 2; ++i) {
+        pells::OpenTag root(tokenizer, tokenizer.getToken());
+        object.load(root, nullptr);
+    }
+    EXPECT_EQ(failure(object, "<root>" + content.substr(0, 7) + ' ' + content.substr(7)),
+              "XML document goes on beyond byte 42");
+    EXPECT_EQ(object.words.size(), 3u) << "what came before stays";
+    InTag::setMaximumDocumentSize(before);
 }
 
 #if !defined(_WIN32)

@@ -92,7 +92,7 @@ TEST_F(Proportion, OfAPictureThatIsClaimedButNotThere) {
     for (const int depth : {8, 24, 32}) {
         for (const std::size_t delivered : {0u, 100000u, 1000000u}) {
             const std::string file =
-                pells_test::tgaHeader(65535, 65535, depth) + std::string(delivered, 'x');
+                pells_test::tgaHeader(16384, 16384, depth) + std::string(delivered, 'x');
             pells_test::ChunkedBuffer withoutEnd(file, 1000);
             std::istream in(&withoutEnd);
             const AllocationMeter meter;
@@ -210,6 +210,13 @@ TEST_F(Proportion, OfElementsInsideElements) {
 
     RepeatedText known("<root>", "<child class='Everything'>", 10000000, "");
     EXPECT_LT(peakOfLoading(known, "Malformed XML: nested too deeply"), 4 * MiB);
+
+    RepeatedText text("<root><s>", "0123456789", 100000000, "</s></root>");
+    EXPECT_LT(peakOfLoading(text, "XML token larger than 67108864 bytes"), 256 * MiB);
+
+    pells::InTag::setMaximumDocumentSize(16 * MiB);
+    RepeatedText materials("<root><materials>", "<material/>", 100000000, "</materials></root>");
+    EXPECT_LT(peakOfLoading(materials, "XML document goes on beyond byte 16777222"), 1024 * MiB);
 }
 
 }  // namespace

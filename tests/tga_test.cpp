@@ -127,11 +127,20 @@ TEST_F(Tga, IsRefusedWithItsReason) {
         EXPECT_EQ(image.getNumComponents(), each.components);
         EXPECT_EQ(image.isGrayscale(), each.grayscale);
     }
+    const std::uint64_t limit = TGAFileLoader::maximumPixels();
+    EXPECT_EQ(limit, std::uint64_t{16384} * 16384);
+    TGAFileLoader::setMaximumPixels(35);
+    for (const int depth : {8, 24, 32}) {
+        EXPECT_TRUE(load(tgaFile(5, 7, depth)));
+        EXPECT_FALSE(load(tgaFile(6, 6, depth)));
+        EXPECT_EQ(logLines("error: ").back(), "tga image too large");
+    }
+    TGAFileLoader::setMaximumPixels(limit);
     std::istringstream in(tgaFile(1, 1, 24));
     EXPECT_FALSE(TGAFileLoader::loadTarga(nullptr, in));
     EXPECT_EQ(in.tellg(), 0);
     EXPECT_EQ(logLines("error: ").back(), "can't load TGA into NULL Image");
-    EXPECT_EQ(logLines("error: ").size(), std::size(cases) + 1);
+    EXPECT_EQ(logLines("error: ").size(), std::size(cases) + 4);
 }
 
 TEST_F(Tga, MayEndOrThrowAtEveryByte) {

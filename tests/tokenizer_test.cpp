@@ -39,8 +39,8 @@ TEST(Tokenizer, ReadsTagsAndTextWithReferences) {
         {"a &lt; b &amp;&amp; c &gt;&apos;&quot;", text + "\"a < b && c >'\"\""},
         {"&foo;&LT;&quot-9_;", text + "\"???\""},
         {"&#65;&#x41;&#x4a;&#x4A;&#233;&#8364;", text + "\"AAJJ\xE9\xAC\""},
-        {"&#256;&#x100000042;", text + '"' + '\0' + "B\""},
-        {"&#x10000000000000000;\x01\x7F]]>", text + "\"\xFF\x01\x7F]]>\""}};
+        {"&#256;&#xFFFFFF42;&#4294967105;", text + '"' + '\0' + "BA\""},
+        {"&#x100000042;&#4294967296;\x01\x7F]]>", text + "\"\xFF\xFF\x01\x7F]]>\""}};
     for (const auto& each : examples)
         EXPECT_EQ(tokensOf("<t\n>" + each.first + "</t >"),
                   openT + "Token: " + each.second + "\nToken: 3 (T_CLOSE) </t>\n");
@@ -106,6 +106,55 @@ TEST(TokenizerStream, StreamThatIsNotGoodEndsTheTokens) {
     EXPECT_EQ(thrower.getToken().value, "a");
     EXPECT_THROW(thrower.getToken(), std::ios_base::failure);
     EXPECT_EQ(thrower.getToken().type, Token::T_EOF);
+}
+
+/// The number of tokens that a text gives, then why there are no more.
+std::string countTokens(const std::string& text, std::size_t blockSize, std::uint64_t end) {
+    ChunkedBuffer buffer(text, blockSize);
+    std::istream in(&buffer);
+    XMLTokenizer tokenizer(in);
+    int count = 0;
+    try {
+        while (tokenizer.getToken(end).type != Token::T_EOF)
+            ++count;
+    } catch (const XMLTokenizer::TooLarge& reason) {
+        EXPECT_EQ(tokenizer.getToken().type, Token::T_EOF);
+        return std::to_string(count) + ' ' + reason.what();
+    }
+    return std::to_string(count);
+}
+
+TEST(TokenizerLimits, HoldForTheTokenAndForTheDocumentHoweverTheyCome) {
+    const std::size_t before = XMLTokenizer::maximumTokenSize();
+    XMLTokenizer::setMaximumTokenSize(100);
+    const std::string most(100, 'x');
+    const std::string tooLarge = "XML token larger than 100 bytes";
+    const std::pair<std::string, std::string> cases[] = {
+        {"<a>" + most + "</a>", "3"},
+        {"<a>" + most + "x</a>", "1 " + tooLarge},
+        {"<a>" + most + "<!-- " + most + "-->&amp;</a>", "1 " + tooLarge},
+        {"<a>&amp;" + most.substr(1) + "<!---->&amp;", "1 " + tooLarge},
+        {"<" + most + "/><" + most + "x/>", "1 " + tooLarge},
+        {"</" + most + "></" + most + "x>", "1 " + tooLarge},
+        {"<b a='" + most.substr(66) + "'/>", "1"},
+        {"<b a='" + most.substr(65) + "'/>", "0 " + tooLarge},
+        {"<b a='" + most.substr(66) + "&amp;'/>", "0 " + tooLarge},
+        {"<b a='' c=''/>", "0 " + tooLarge},
+        {"<!--" + most + most + "--><a/>", "1"}};
+    for (const auto& each : cases) {
+        for (const std::size_t size : {1u, 7u, 1000u})
+            EXPECT_EQ(countTokens(each.first, size, 1000), each.second) << each.first;
+    }
+    XMLTokenizer::setMaximumTokenSize(before);
+
+    const std::string text = "<a>text<b/></a>";
+    const std::string comment = "<!--" + std::string(10000, 'x') + "-->";
+    const std::string behind = " XML document goes on beyond byte ";
+    for (const std::size_t size : {1u, 7u, 100000u}) {
+        EXPECT_EQ(countTokens(text, size, text.size()), "4");
+        EXPECT_EQ(countTokens(text, size, text.size() - 1), "3" + behind + "14");
+        EXPECT_EQ(countTokens("<a>" + comment + "<b/>", size, 100), "1" + behind + "100");
+    }
 }
 
 TEST(Tokens, AreLoggedWhateverTheirTypeAndTheStream) {

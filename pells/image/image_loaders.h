@@ -1,6 +1,7 @@
 #pragma once
 
 #include <boost/smart_ptr/intrusive_ptr.hpp>
+#include <cstdint>
 #include <iosfwd>
 #include <memory>
 #include <string>
@@ -78,11 +79,17 @@ public:
     ///        pixels were incomplete or too many. It keeps the grey levels of an earlier grey
     ///        picture unless the new one has grey levels of its own.
     /// \return false, after one line under "error", for null, for other depths, for colour maps and
-    ///         when the stream ends early or memory for the picture cannot be had. Memory is taken
-    ///         as the bytes arrive, not as the header claims.
+    ///         when the stream ends early or memory for the picture cannot be had, or it is
+    ///         larger than maximumPixels(). Memory is taken as the bytes arrive, not as the header
+    ///         claims.
     /// \throws what the stream throws; the image then has no data.
     /// Format: Truevision TGA 2.0.
     static bool loadTarga(Image_base* image, std::istream& in);
+
+    /// The largest picture that is read, in pixels: 2^28, or 16384 x 16384, unless it was set. A
+    /// larger one counts as one that memory cannot be had for.
+    static std::uint64_t maximumPixels();
+    static void setMaximumPixels(std::uint64_t pixels);
 
 private:
     struct Header;

@@ -20,13 +20,19 @@ namespace {
 
 using Bytes = std::unique_ptr<unsigned char[]>;
 
+std::uint64_t pixelLimit = std::uint64_t{1} << 28;
+
+void reportTooLarge() {
+    PELLS_LOG("error", "tga image too large");
+}
+
 /// Uninitialised memory, or null after a line in the log.
 Bytes allocate(std::uint64_t size) {
     Bytes bytes;
     if (size <= static_cast<std::uint64_t>(std::numeric_limits<std::ptrdiff_t>::max()))
         bytes.reset(new (std::nothrow) unsigned char[static_cast<std::size_t>(size)]);
     if (!bytes)
-        PELLS_LOG("error", "tga image too large");
+        reportTooLarge();
     return bytes;
 }
 
@@ -158,6 +164,14 @@ struct TGAFileLoader::Header {
     bool topFirst;
 };
 
+std::uint64_t TGAFileLoader::maximumPixels() {
+    return pixelLimit;
+}
+
+void TGAFileLoader::setMaximumPixels(std::uint64_t pixels) {
+    pixelLimit = pixels;
+}
+
 bool TGAFileLoader::loadTarga(Image_base* image, std::istream& in) {
     if (!image) {
         PELLS_LOG("error", "can't load TGA into NULL Image");
@@ -232,6 +246,10 @@ std::unique_ptr<unsigned char[]> TGAFileLoader::_loadData(std::istream& in, int 
         static_cast<std::size_t>(width) * static_cast<std::size_t>(components);
     const std::size_t rows = static_cast<std::size_t>(height);
     const std::uint64_t size = std::uint64_t(rowBytes) * rows;
+    if (size / static_cast<std::uint64_t>(components) > pixelLimit) {
+        reportTooLarge();
+        return nullptr;
+    }
     PixelRows pixels(rowBytes, rows, topFirst);
     // Memory for the whole picture is taken at once only if its bytes are there.
     if (surelyHolds(in, size) && !pixels.grow(rows))

@@ -6,6 +6,7 @@
 
 #include "pells/core/no_destructor.h"
 #include "pells/log/log.h"
+#include "pells/serial/nesting.h"
 #include "pells/xml/tag.h"
 
 namespace pells {
@@ -36,6 +37,7 @@ void CompositeField::save(const Serializable* obj, OutTag& tag) {
         tag.writeSingleTag();
         return;
     }
+    detail::checkNesting(tag);
     tag.writeOpenTag(true);
     std::vector<Field*, detail::PooledAllocator<Field*>> fields;
     fields.reserve(desc.size());

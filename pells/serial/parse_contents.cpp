@@ -15,11 +15,16 @@ namespace pells {
 
 namespace {
 
-XMLTokenizer::Token nextToken(XMLTokenizer& tokenizer) {
+/// \param end of the document at the latest, see XMLTokenizer::getToken().
+XMLTokenizer::Token nextToken(XMLTokenizer& tokenizer, std::uint64_t end) {
     static const NoDestructor<Enum<PerformanceCategory>> parser("parser");
     static const NoDestructor<std::string> label("next token");
     const Performance probe(*label, parser->get());
-    return tokenizer.getToken();
+    try {
+        return tokenizer.getToken(end);
+    } catch (const XMLTokenizer::TooLarge& reason) {
+        throw Serializable::LoadFail(reason.what());
+    }
 }
 
 }  // namespace
@@ -100,7 +105,7 @@ void OpenTag::parseContents(Serializable* obj, const ClassDesc& desc) {
     SkippedElements skipped;
     bool open = true;
     while (open) {
-        Token token = nextToken(tokenizer);
+        Token token = nextToken(tokenizer, documentEnd);
         PELLS_LOG("load", "Processing " << token);
         open = _parseToken(token, obj, desc, skipped);
     }

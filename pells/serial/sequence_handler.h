@@ -10,6 +10,7 @@
 #include "pells/core/strings.h"
 #include "pells/serial/accessor.h"
 #include "pells/serial/class_desc.h"
+#include "pells/serial/nesting.h"
 #include "pells/serial/simple_field.h"
 #include "pells/serial/simple_type_handler.h"
 #include "pells/serial/type_handler.h"
@@ -88,6 +89,7 @@ void SequenceTypeHandler<Seq>::save(const Seq& sequence, OutTag& tag) {
         tag.writeSingleTag();
         return;
     }
+    detail::checkNesting(tag);
     tag.writeOpenTag(true);
     const Item* const first = sequence.data();
     const boost::intrusive_ptr<Accessor<Item>> items(

@@ -34,8 +34,9 @@ class OutTag;
 ///     part.load(in, nullptr);
 class PELLS_API Serializable {
 public:
-    /// Thrown by classes of the application that cannot save an object. Making one logs
-    /// "SaveFail: " and the message under "error".
+    /// Thrown when an object is nested too deeply to be loaded again, and by classes of the
+    /// application that cannot save an object. Making one logs "SaveFail: " and the message under
+    /// "error".
     class PELLS_API SaveFail : public std::runtime_error {
     public:
         explicit SaveFail(const std::string& message);
@@ -56,6 +57,9 @@ public:
 
     /// Writes the object as the element that the tag names.
     ///
+    /// \throws SaveFail "Nested too deeply to be loaded: " and the path of an element deeper than
+    ///         InTag::maximumDepth(), as where an object holds itself; what lies before it has been
+    ///         written by then.
     /// \throws LoadFail "No save() method" when the class overrides neither this nor getField().
     virtual void save(OutTag& tag);
 

@@ -7,6 +7,7 @@
 #include "pells/core/export.h"
 #include "pells/serial/class_desc.h"
 #include "pells/serial/field.h"
+#include "pells/serial/nesting.h"
 #include "pells/serial/text_form.h"
 #include "pells/serial/type_handler.h"
 #include "pells/xml/tag.h"
@@ -63,6 +64,7 @@ private:
 
 template <class T>
 void TextTypeHandler<T>::save(const T& value, OutTag& tag) {
+    detail::checkNesting(tag);
     tag.writeOpenTag(false);
     detail::writeText(value, tag);
     tag.writeCloseTag(false);

@@ -23,7 +23,15 @@ public:
     ///         the token may go on behind `limit`. Then it stays one of type T_IGNORE.
     const char* read(const char* next, const char* limit);
 
+    /// Makes it as it was before a token was read.
+    void forget() {
+        kind = XMLTokenizer::Token::T_IGNORE;
+        text = endText = nullptr;
+    }
+
     XMLTokenizer::Token::TokenType type() const { return kind; }
+
+    static const std::size_t mostAttributes = 16;
 
     /// A tag's name, or character data; empty before a token was read.
     std::string value() const { return std::string(text, endText); }
@@ -51,7 +59,6 @@ private:
     const char* text = nullptr;
     const char* endText = nullptr;
 
-    static const std::size_t mostAttributes = 16;
     std::size_t attributeCount = 0;
     /// Not filled in advance, which would cost more than most tags do.
     Attribute attributes[mostAttributes];

@@ -1,5 +1,9 @@
 #include "pells/xml/stream_window.h"
 
+#include <string>
+
+#include "pells/xml/tokenizer.h"
+
 namespace pells {
 
 namespace {
@@ -13,7 +17,13 @@ bool StreamWindow::refuse() {
     return false;
 }
 
+void StreamWindow::refuseLength() const {
+    throw XMLTokenizer::TooLarge("XML document goes on beyond byte " + std::to_string(end));
+}
+
 bool StreamWindow::refill() {
+    if (isBehindEnd())
+        refuseLength();
     // Flushes the stream that this one is tied to, as it may wait for an answer.
     const std::istream::sentry ready(in, true);
     if (!ready)
@@ -36,13 +46,14 @@ bool StreamWindow::refill() {
 
 /// Tells the buffer which characters were used; none are at hand afterwards.
 void StreamWindow::consume() {
-    const char* const used = next;
+    const char* const reached = next;
     const bool wasSingle = isSingle();
-    next = limit = nullptr;
-    if (wasSingle && used == &single + 1)
+    used = getPosition();
+    begin = next = limit = nullptr;
+    if (wasSingle && reached == &single + 1)
         buffer->sbumpc();
-    else if (!wasSingle && used)
-        GetArea::moveTo(*buffer, used);
+    else if (!wasSingle && reached)
+        GetArea::moveTo(*buffer, reached);
 }
 
 void StreamWindow::releaseSingle() {
@@ -62,6 +73,7 @@ void StreamWindow::look(char character) {
         next = &single;
         limit = &single + 1;
     }
+    begin = next;
 }
 
 /// To be called where an exception of the buffer is handled.

@@ -1,6 +1,8 @@
 #pragma once
 
+#include <cstdint>
 #include <istream>
+#include <limits>
 #include <streambuf>
 
 namespace pells {
@@ -31,7 +33,20 @@ public:
     /// \return false at the end of the stream, which gets its state bits as from a formatted read.
     /// \throws what the buffer throws when the stream's exceptions() ask for badbit, and
     ///         std::ios_base::failure when they ask for a bit that gets set.
+    /// \throws XMLTokenizer::TooLarge behind the end that was set.
     bool refill();
+
+    /// How many characters were used since the window was made. Those that others took in between
+    /// do not count.
+    std::uint64_t getPosition() const { return used + static_cast<std::uint64_t>(next - begin); }
+
+    /// Sets how far characters may be used.
+    void setEnd(std::uint64_t position) { end = position; }
+
+    bool isBehindEnd() const { return getPosition() > end; }
+
+    /// Says that there is more behind the end. \throws XMLTokenizer::TooLarge
+    [[noreturn]] void refuseLength() const;
 
     const char* next = nullptr;
     const char* limit = nullptr;
@@ -56,6 +71,10 @@ private:
     /// The stream again, without the detour through its virtual base.
     std::ios& state;
     std::streambuf* buffer = nullptr;
+    /// Where `next` was when characters were last counted.
+    const char* begin = nullptr;
+    std::uint64_t used = 0;
+    std::uint64_t end = std::numeric_limits<std::uint64_t>::max();
     /// Stands in for the get area of a buffer that has none.
     char single = 0;
 };
@@ -72,12 +91,14 @@ inline bool StreamWindow::attach() {
     if (!state.good())
         return refuse();
     buffer = state.rdbuf();
-    next = GetArea::next(*buffer);
+    begin = next = GetArea::next(*buffer);
     limit = GetArea::limit(*buffer);
     return true;
 }
 
 inline void StreamWindow::release() {
+    used = getPosition();
+    begin = next;
     if (isSingle())
         releaseSingle();
     else if (next)

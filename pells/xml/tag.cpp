@@ -2,8 +2,10 @@
 
 #include <algorithm>
 #include <cstring>
+#include <limits>
 #include <locale>
 #include <utility>
+#include <vector>
 
 #include "pells/core/no_destructor.h"
 #include "pells/serial/serializable.h"
@@ -13,9 +15,13 @@ namespace pells {
 
 namespace {
 
-const std::size_t indentStep = 4;
-
 unsigned depthLimit = 200;
+std::uint64_t documentLimit = std::uint64_t{256} * 1024 * 1024;
+
+std::uint64_t endOfDocument(std::uint64_t start) {
+    const std::uint64_t most = std::numeric_limits<std::uint64_t>::max();
+    return start + std::min(documentLimit, most - start);
+}
 
 }  // namespace
 
@@ -31,18 +37,21 @@ void Tag::setAttr(const std::string& attrName, std::string value) {
     attrs.set(attrName, std::move(value));
 }
 
-InTag::InTag(XMLTokenizer& source) : tokenizer(source) {}
+InTag::InTag(XMLTokenizer& source)
+    : tokenizer(source), documentEnd(endOfDocument(source.getPosition())) {}
 
 InTag::InTag(const InTag& other)
     : Tag(other),
       tokenizer(other.tokenizer),
       depth(other.depth),
+      documentEnd(other.documentEnd),
       text(other.text),
       version(other.version) {}
 
 InTag::InTag(const ChildOf& family)
     : tokenizer(family.parent.tokenizer),
       depth(family.parent.depth + 1),
+      documentEnd(family.parent.documentEnd),
       version(family.parent.version) {}
 
 InTag::~InTag() = default;
@@ -68,6 +77,14 @@ unsigned InTag::maximumDepth() {
 
 void InTag::setMaximumDepth(unsigned levels) {
     depthLimit = levels;
+}
+
+std::uint64_t InTag::maximumDocumentSize() {
+    return documentLimit;
+}
+
+void InTag::setMaximumDocumentSize(std::uint64_t bytes) {
+    documentLimit = bytes;
 }
 
 void InTag::setData(const Token& token) {
@@ -125,14 +142,25 @@ OutTag::OutTag(std::ostream& stream, const std::string& tagName) : out(stream) {
     name = tagName;
 }
 
-OutTag::OutTag(OutTag& parent) : Tag(parent), out(parent.out), indent(parent.indent + indentStep) {}
+OutTag::OutTag(OutTag& outer)
+    : Tag(outer), out(outer.out), parent(&outer), depth(outer.depth + 1) {}
 
-OutTag::OutTag(OutTag& parent, const std::string& tagName)
-    : out(parent.out), indent(parent.indent + indentStep) {
+OutTag::OutTag(OutTag& outer, const std::string& tagName)
+    : out(outer.out), parent(&outer), depth(outer.depth + 1) {
     name = tagName;
 }
 
 OutTag::~OutTag() = default;
+
+std::string OutTag::getPath() const {
+    std::vector<const std::string*> names;
+    for (const OutTag* each = this; each; each = each->parent)
+        names.push_back(&each->name);
+    std::string path = *names.back();
+    for (auto each = names.rbegin() + 1; each != names.rend(); ++each)
+        path += '/' + **each;
+    return path;
+}
 
 void OutTag::setTag(const std::string& tagName) {
     name = tagName;
@@ -202,19 +230,19 @@ private:
 
 void OutTag::writeOpenTag(bool newline) {
     Line line(out);
-    line.appendSpaces(indent).append("<");
+    line.appendSpaces(indent()).append("<");
     appendTagAndAttrs(line);
     line.append(">\n", newline ? 2 : 1).flush();
 }
 
 void OutTag::writeCloseTag(bool indented) {
     Line line(out);
-    line.appendSpaces(indented ? indent : 0).append("</").append(name).append(">\n").flush();
+    line.appendSpaces(indented ? indent() : 0).append("</").append(name).append(">\n").flush();
 }
 
 void OutTag::writeSingleTag() {
     Line line(out);
-    line.appendSpaces(indent).append("<");
+    line.appendSpaces(indent()).append("<");
     appendTagAndAttrs(line);
     line.append("/>\n").flush();
 }

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <istream>
 #include <memory>
 #include <ostream>
@@ -64,8 +65,10 @@ public:
     ///
     /// \param obj is handed to the fields as it is; may be null where they need none.
     /// \throws Serializable::LoadFail for an end tag that does not match, for input that ends
-    ///         inside the element, for elements nested deeper than maximumDepth(), and as the
-    ///         fields do. What was read until then stays in the object.
+    ///         inside the element, for elements nested deeper than maximumDepth(), for a document
+    ///         larger than maximumDocumentSize() or a token larger than
+    ///         XMLTokenizer::maximumTokenSize(), and as the fields do. What was read until then
+    ///         stays in the object.
     virtual void parseContents(Serializable* obj, const ClassDesc& desc) = 0;
 
     /// The whole current text, however much of it was scanned. Valid until the next text is read.
@@ -90,6 +93,13 @@ public:
     static unsigned maximumDepth();
     static void setMaximumDepth(unsigned levels);
 
+    /// How much text a document may have that is read into objects, in bytes from the start tag of
+    /// its root element on: 256 MiB unless it was set. Objects take several times as much memory.
+    static std::uint64_t maximumDocumentSize();
+
+    /// Takes effect for root elements that are made later.
+    static void setMaximumDocumentSize(std::uint64_t bytes);
+
 protected:
     typedef XMLTokenizer::Token Token;
 
@@ -107,6 +117,8 @@ protected:
 
     XMLTokenizer& tokenizer;
     unsigned depth = 1;
+    /// How far the document may reach in the tokenizer's stream.
+    std::uint64_t documentEnd;
 
 private:
     std::string text;
@@ -171,17 +183,24 @@ public:
     /// The root element.
     OutTag(std::ostream& stream, const std::string& tagName);
 
-    /// A child of the parent's name and attributes: a copy is one level deeper.
-    OutTag(OutTag& parent);  // NOLINT(google-explicit-constructor): a copy constructor
+    /// A child of the outer element's name and attributes: a copy is one level deeper. The outer
+    /// one outlives its children.
+    OutTag(OutTag& outer);  // NOLINT(google-explicit-constructor): a copy constructor
 
     /// A child without attributes.
-    OutTag(OutTag& parent, const std::string& tagName);
+    OutTag(OutTag& outer, const std::string& tagName);
 
     OutTag& operator=(const OutTag&) = delete;
     ~OutTag() override;
 
     /// The stream that the whole document is written to.
     std::ostream& getStream() { return out; }
+
+    /// How deep the element is nested; the root element is at depth 1.
+    unsigned getDepth() const { return depth; }
+
+    /// The names of the elements from the root to this one, as in "root/history/stack".
+    std::string getPath() const;
 
     void setTag(const std::string& tagName);
     void clearAttrs();
@@ -207,8 +226,12 @@ private:
 
     void appendTagAndAttrs(Line& line) const;
 
+    /// In spaces.
+    std::size_t indent() const { return std::size_t{4} * (depth - 1); }
+
     std::ostream& out;
-    std::size_t indent = 0;  // in spaces
+    const OutTag* const parent = nullptr;
+    const unsigned depth = 1;
 };
 
 }  // namespace pells

@@ -1,8 +1,11 @@
 #include "pells/xml/tokenizer.h"
 
+#include <algorithm>
 #include <cstring>
 #include <limits>
+#include <string>
 #include <string_view>
+#include <type_traits>
 
 #include "pells/xml/char_class.h"
 #include "pells/xml/plain_token.h"
@@ -14,6 +17,11 @@ namespace pells {
 namespace {
 
 typedef XMLTokenizer::Token Token;
+
+std::size_t tokenLimit = std::size_t{64} * 1024 * 1024;
+
+/// What an attribute counts for beside its characters: about what its two strings take when empty.
+const std::size_t attributeCost = 64;
 
 /// Takes the place of a string whose characters nobody wants.
 struct Discard {
@@ -67,6 +75,12 @@ public:
 
     Token next() override;
 
+    std::uint64_t getPosition() const { return window.getPosition(); }
+    void setEnd(std::uint64_t position) { window.setEnd(position); }
+
+    /// Ends the tokens. \throws XMLTokenizer::TooLarge
+    [[noreturn]] void refuseSize();
+
 private:
     [[gnu::noinline]] void readInPieces(Token& token, bool ready);
     bool readToken(Token& token);
@@ -93,11 +107,15 @@ private:
     bool skipSpace();
 
     template <class Text>
+    void charge(std::size_t size);
+    template <class Text>
     void makeRoom(Text& text, char end);
     template <class Text, class End>
     void take(Text& into, End isEnd);
 
     StreamWindow window;
+    /// How much larger the token may become.
+    std::size_t room = 0;
     /// No more tokens. Set while one is read, too, so that an exception ends them.
     bool ended = true;
     /// The text just read is the last token: what follows it is no reference.
@@ -111,7 +129,13 @@ XMLParser::XMLParser(std::istream& in) : window(in) {
 Token XMLParser::next() {
     const bool ready = !std::exchange(ended, true) && window.attach();
     PlainToken plain;
-    const char* const behind = ready ? plain.read(window.next, window.limit) : nullptr;
+    const char* behind = ready ? plain.read(window.next, window.limit) : nullptr;
+    // What may be too large is counted exactly, in pieces.
+    const std::size_t margin = PlainToken::mostAttributes * attributeCost;
+    if (behind && static_cast<std::size_t>(behind - window.next) + margin > tokenLimit) {
+        plain.forget();
+        behind = nullptr;
+    }
     // Made where the caller wants it, as moving tokens takes as long as reading short ones.
     Token token{plain.type(), plain.value(), {}};
     if (!behind) {
@@ -120,6 +144,8 @@ Token XMLParser::next() {
     }
     plain.getAttributes(token.attrs);
     window.next = behind;
+    if (window.isBehindEnd())
+        window.refuseLength();
     window.release();
     ended = false;
     return token;
@@ -127,7 +153,10 @@ Token XMLParser::next() {
 
 /// Reads a token that is not plain, or not all at hand.
 void XMLParser::readInPieces(Token& token, bool ready) {
+    room = tokenLimit;
     const bool found = ready && readToken(token);
+    if (window.isBehindEnd())
+        window.refuseLength();
     if (ready)
         window.release();
     ended = !found || lastText;
@@ -188,6 +217,7 @@ bool XMLParser::readAttribute(Token& token) {
     // Few tags come here, and most of those have few attributes.
     if (token.attrs.empty())
         token.attrs.reserve(4);
+    charge<std::string>(attributeCost);
     token.attrs.emplace_back();
     take(token.attrs.back().first, EndOfName());
     return readValue(token.attrs.back().second);
@@ -215,6 +245,7 @@ bool XMLParser::readText(Token& token) {
             lastText = true;
             break;
         }
+        charge<std::string>(1);
         token.value.push_back(decoded);
     } while (window.more() && *window.next != '<');
     token.type = Token::T_TEXT;
@@ -279,6 +310,7 @@ bool XMLParser::readValue(Text& value) {
         char decoded = 0;
         if (!at('&') || !readReference(decoded))
             return false;
+        charge<Text>(1);
         value.push_back(decoded);
     }
 }
@@ -292,12 +324,12 @@ bool XMLParser::readReference(char& decoded) {
     return readNumber(CLASS_HEX_DIGIT, 16, decoded);
 }
 
-/// Digits give the same number as they give std::strtoul().
+/// A number that 32 bits cannot hold is the largest that they can.
 bool XMLParser::readNumber(CharClass digits, unsigned base, char& decoded) {
     if (!atAny(digits))
         return false;
-    const unsigned long largest = std::numeric_limits<unsigned long>::max();
-    unsigned long number = 0;
+    const std::uint32_t largest = std::numeric_limits<std::uint32_t>::max();
+    std::uint32_t number = 0;
     for (; atAny(digits); ++window.next) {
         const unsigned digit = digitValue(*window.next);
         number = number > (largest - digit) / base ? largest : number * base + digit;
@@ -342,13 +374,30 @@ bool XMLParser::skipSpace() {
     return true;
 }
 
+/// Counts what a text is about to gain; one that is discarded costs nothing.
+template <class Text>
+void XMLParser::charge(std::size_t size) {
+    if constexpr (std::is_same_v<Text, std::string>) {
+        if (size > room)
+            refuseSize();
+        room -= size;
+    }
+}
+
+void XMLParser::refuseSize() {
+    ended = true;
+    throw XMLTokenizer::TooLarge("XML token larger than " + std::to_string(tokenLimit) + " bytes");
+}
+
 /// Makes room in an empty text for what goes up to `end`, if that is at hand. Decoding shortens it.
 template <class Text>
 void XMLParser::makeRoom(Text& text, char end) {
     const std::size_t size = static_cast<std::size_t>(window.limit - window.next);
     const void* const found = size != 0 ? std::memchr(window.next, end, size) : nullptr;
-    if (found)
-        text.reserve(static_cast<std::size_t>(static_cast<const char*>(found) - window.next));
+    if (found) {
+        const char* const stop = static_cast<const char*>(found);
+        text.reserve(std::min(room, static_cast<std::size_t>(stop - window.next)));
+    }
 }
 
 /// Appends the characters up to one that `ends` them, in one piece if they are at hand in one.
@@ -357,6 +406,7 @@ void XMLParser::take(Text& into, End isEnd) {
     const char* stop = nullptr;
     do {
         stop = scan(window.next, window.limit, isEnd);
+        charge<Text>(static_cast<std::size_t>(stop - window.next));
         into.append(window.next, stop);
         window.next = stop;
     } while (stop == window.limit && window.refill());
@@ -370,6 +420,10 @@ struct NextToken {
 
 }  // namespace
 
+XMLTokenizer::TooLarge::TooLarge(const std::string& message) : std::runtime_error(message) {}
+
+XMLTokenizer::TooLarge::~TooLarge() = default;
+
 XMLTokenizer::XMLParserMixin::~XMLParserMixin() = default;
 
 XMLTokenizer::XMLTokenizer(std::istream& in) {
@@ -379,9 +433,23 @@ XMLTokenizer::XMLTokenizer(std::istream& in) {
 
 XMLTokenizer::~XMLTokenizer() = default;
 
-XMLTokenizer::Token XMLTokenizer::getToken() {
+std::size_t XMLTokenizer::maximumTokenSize() {
+    return tokenLimit;
+}
+
+void XMLTokenizer::setMaximumTokenSize(std::size_t bytes) {
+    tokenLimit = bytes;
+}
+
+std::uint64_t XMLTokenizer::getPosition() const {
+    return static_cast<const XMLParser&>(*parser).getPosition();
+}
+
+XMLTokenizer::Token XMLTokenizer::getToken(std::uint64_t end) {
+    XMLParser& grammar = static_cast<XMLParser&>(*parser);
+    grammar.setEnd(end);
     const bool held = pending.has_value();
-    Token token = held ? std::move(*pending) : static_cast<XMLParser&>(*parser).next();
+    Token token = held ? std::move(*pending) : grammar.next();
     if (held)
         pending.reset();
     else if (token.type == Token::T_TEXT)
@@ -390,9 +458,14 @@ XMLTokenizer::Token XMLTokenizer::getToken() {
 }
 
 void XMLTokenizer::completeText(Token& text) {
-    const NextToken next{static_cast<XMLParser&>(*parser)};
+    XMLParser& grammar = static_cast<XMLParser&>(*parser);
+    const NextToken next{grammar};
     pending.emplace(next);
     while (pending->type == Token::T_TEXT) {
+        if (text.value.size() + pending->value.size() > tokenLimit) {
+            pending.reset();
+            grammar.refuseSize();
+        }
         text.value += pending->value;
         pending.reset();
         pending.emplace(next);

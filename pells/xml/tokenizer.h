@@ -1,9 +1,13 @@
 #pragma once
 
+#include <cstddef>
+#include <cstdint>
 #include <istream>
+#include <limits>
 #include <memory>
 #include <optional>
 #include <ostream>
+#include <stdexcept>
 #include <string>
 #include <utility>
 #include <vector>
@@ -27,7 +31,7 @@ namespace pells {
 ///  - References, in character data and attribute values: `&amp;`, `&lt;`, `&gt;`, `&apos;` and
 ///    `&quot;`; any other name gives a question mark. `&#233;` and `&#xE9;` (with a small x) give
 ///    one byte, the low eight bits of the number: `&#256;` is a zero byte, `&#8364;` is 0xAC, and a
-///    number too large for an unsigned long is 0xFF.
+///    number too large for 32 bits is 0xFF.
 ///  - Comments, and declarations such as `<?xml version="1.0" encoding="utf-8"?>`, at any place
 ///    where a tag may stand. They are skipped, and do not end a run of character data. Comments may
 ///    not hold two hyphens in a row, nor control characters other than white space. After the
@@ -40,7 +44,8 @@ namespace pells {
 /// open.
 ///
 /// Input is read in one pass, straight from the stream's buffer, and holds no more memory than the
-/// longest token: comments and white space of any length cost none. One thread.
+/// longest token, see maximumTokenSize(): comments and white space of any length cost none. One
+/// thread.
 class PELLS_API XMLTokenizer {
 public:
     /// One token, copied by value.
@@ -60,6 +65,15 @@ public:
         std::string value;
         /// Names and decoded values in document order, for T_SINGLE and T_OPEN; otherwise empty.
         std::vector<Attribute> attrs;
+    };
+
+    /// A token is larger than maximumTokenSize(), or goes on where getToken() was told to stop.
+    class PELLS_API TooLarge : public std::runtime_error {
+    public:
+        explicit TooLarge(const std::string& message);
+        TooLarge(const TooLarge&) = default;
+        TooLarge& operator=(const TooLarge&) = default;
+        ~TooLarge() override;
     };
 
     class XMLParserMixin;
@@ -86,7 +100,21 @@ public:
     /// stream that is not good ends the tokens. What its buffer throws sets badbit and ends the
     /// tokens; it goes on to the caller when the stream's exceptions() ask for badbit, as those of
     /// archive streams do. After an exception the tokens have ended, too.
-    Token getToken();
+    ///
+    /// \param end how far tokens may reach, counted as getPosition() counts.
+    /// \throws TooLarge for a token that is larger than maximumTokenSize(), or reaches further than
+    ///         `end`. Comments and white space before it count for `end` only.
+    Token getToken(std::uint64_t end = std::numeric_limits<std::uint64_t>::max());
+
+    /// How many bytes of the stream the tokens so far have taken, with what lies between them.
+    std::uint64_t getPosition() const;
+
+    /// How large a token may be, in bytes: the characters of its name, its text and its attributes
+    /// after decoding, and 64 for each attribute. 64 MiB unless it was set.
+    static std::size_t maximumTokenSize();
+
+    /// Takes effect with the next token.
+    static void setMaximumTokenSize(std::size_t bytes);
 
 private:
     void completeText(Token& text);

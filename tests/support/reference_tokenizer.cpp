@@ -44,8 +44,9 @@ private:
     auto setNumber(int base) {
         return [this, base](auto first, auto last) {
             const std::string digits(first, last);
-            const unsigned long number = std::strtoul(digits.c_str(), nullptr, base);
-            entity = static_cast<char>(static_cast<unsigned char>(number));
+            const std::uint64_t number = std::strtoull(digits.c_str(), nullptr, base);
+            const std::uint64_t largest = std::numeric_limits<std::uint32_t>::max();
+            entity = static_cast<char>(static_cast<unsigned char>(std::min(number, largest)));
         };
     }
     auto setToken(Token::TokenType type) {
