@@ -22,6 +22,7 @@ void StreamWindow::refuseLength() const {
 }
 
 bool StreamWindow::refill() {
+    count();
     if (isBehindEnd())
         refuseLength();
     // Flushes the stream that this one is tied to, as it may wait for an answer.
@@ -48,7 +49,7 @@ bool StreamWindow::refill() {
 void StreamWindow::consume() {
     const char* const reached = next;
     const bool wasSingle = isSingle();
-    used = getPosition();
+    count();
     begin = next = limit = nullptr;
     if (wasSingle && reached == &single + 1)
         buffer->sbumpc();

@@ -36,14 +36,26 @@ public:
     /// \throws XMLTokenizer::TooLarge behind the end that was set.
     bool refill();
 
-    /// How many characters were used since the window was made. Those that others took in between
-    /// do not count.
-    std::uint64_t getPosition() const { return used + static_cast<std::uint64_t>(next - begin); }
+    /// Uses the characters up to a place, and counts them.
+    void takeTo(const char* place) {
+        used += static_cast<std::uint64_t>(place - next);
+        next = place;
+    }
+
+    /// Counts the characters that were used since attach(), or since the last call, without
+    /// takeTo().
+    void count() {
+        used += static_cast<std::uint64_t>(next - begin);
+        begin = next;
+    }
+
+    /// How many characters were counted since the window was made.
+    std::uint64_t getPosition() const { return used; }
 
     /// Sets how far characters may be used.
     void setEnd(std::uint64_t position) { end = position; }
 
-    bool isBehindEnd() const { return getPosition() > end; }
+    bool isBehindEnd() const { return used > end; }
 
     /// Says that there is more behind the end. \throws XMLTokenizer::TooLarge
     [[noreturn]] void refuseLength() const;
@@ -71,7 +83,7 @@ private:
     /// The stream again, without the detour through its virtual base.
     std::ios& state;
     std::streambuf* buffer = nullptr;
-    /// Where `next` was when characters were last counted.
+    /// Where counting began.
     const char* begin = nullptr;
     std::uint64_t used = 0;
     std::uint64_t end = std::numeric_limits<std::uint64_t>::max();
@@ -97,8 +109,6 @@ inline bool StreamWindow::attach() {
 }
 
 inline void StreamWindow::release() {
-    used = getPosition();
-    begin = next;
     if (isSingle())
         releaseSingle();
     else if (next)

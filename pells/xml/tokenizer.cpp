@@ -20,6 +20,9 @@ typedef XMLTokenizer::Token Token;
 
 std::size_t tokenLimit = std::size_t{64} * 1024 * 1024;
 
+/// How large a token may be that is not counted exactly.
+std::size_t plainLimit = 63 * tokenLimit / 64;
+
 /// What an attribute counts for beside its characters: about what its two strings take when empty.
 const std::size_t attributeCost = 64;
 
@@ -131,8 +134,7 @@ Token XMLParser::next() {
     PlainToken plain;
     const char* behind = ready ? plain.read(window.next, window.limit) : nullptr;
     // What may be too large is counted exactly, in pieces.
-    const std::size_t margin = PlainToken::mostAttributes * attributeCost;
-    if (behind && static_cast<std::size_t>(behind - window.next) + margin > tokenLimit) {
+    if (behind && static_cast<std::size_t>(behind - window.next) > plainLimit) {
         plain.forget();
         behind = nullptr;
     }
@@ -143,10 +145,10 @@ Token XMLParser::next() {
         return token;
     }
     plain.getAttributes(token.attrs);
-    window.next = behind;
+    window.takeTo(behind);
+    window.release();
     if (window.isBehindEnd())
         window.refuseLength();
-    window.release();
     ended = false;
     return token;
 }
@@ -155,10 +157,12 @@ Token XMLParser::next() {
 void XMLParser::readInPieces(Token& token, bool ready) {
     room = tokenLimit;
     const bool found = ready && readToken(token);
+    if (ready) {
+        window.count();
+        window.release();
+    }
     if (window.isBehindEnd())
         window.refuseLength();
-    if (ready)
-        window.release();
     ended = !found || lastText;
     if (!found) {
         token = Token();
@@ -438,7 +442,9 @@ std::size_t XMLTokenizer::maximumTokenSize() {
 }
 
 void XMLTokenizer::setMaximumTokenSize(std::size_t bytes) {
+    const std::size_t margin = PlainToken::mostAttributes * attributeCost;
     tokenLimit = bytes;
+    plainLimit = bytes - std::min(bytes, margin);
 }
 
 std::uint64_t XMLTokenizer::getPosition() const {
