@@ -40,10 +40,10 @@ struct HandlerOf<boost::intrusive_ptr<B>> {
 
 /// The handler of every type that is no vector.
 ///
-/// Known are strings, bool, the arithmetic types but characters, Color, persistent classes by value
-/// and pointers to them (B* and boost::intrusive_ptr<B>). An application adds a type of its own by
-/// specialising this template. Where the type has operators << and >>, deriving from
-/// TextTypeHandler does it:
+/// Known are strings, bool, the arithmetic types but characters and long double, Color, persistent
+/// classes by value and pointers to them (B* and boost::intrusive_ptr<B>). An application adds a
+/// type of its own by specialising this template. Where the type has operators << and >>, deriving
+/// from TextTypeHandler does it:
 ///
 ///     template <>
 ///     class pells::SimpleTypeHandler<Angle> : public pells::TextTypeHandler<Angle> {};

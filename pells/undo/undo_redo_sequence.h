@@ -72,10 +72,12 @@ public:
     void save(OutTag& tag) override;
 
     /// Reads steps and appends them to those that the history holds; each one replays itself as it
-    /// is read, and counts as done. Invalid steps receive destroy() and are dropped.
+    /// is read. Then invalid steps receive destroy() and are dropped, and all that are left count
+    /// as done: those that were undone before the call, too, although they are not redone. Who does
+    /// not want that calls clearRedoStack() first.
     ///
     /// What fails in a step or in the document (Serializable::LoadFail) passes through; the history
-    /// then holds what it held and the steps that were read in whole.
+    /// then holds what it held and the steps that were read in whole, with the same consequences.
     void load(InTag& tag, boost::intrusive_ptr<Field> field) override;
     boost::intrusive_ptr<Field> getField(const std::string& name) override;
 
