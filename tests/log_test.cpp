@@ -14,7 +14,9 @@
 
 #include "pells/core/factory.h"
 #include "pells/platform/debugger.h"
+#include "support/debugger_text.h"
 #include "support/test_prefs.h"
+#include "support/thrown.h"
 
 using namespace pells;
 using namespace pells_test;
@@ -57,7 +59,10 @@ TEST_F(LogTest, TakesItsRulesFromTheFileWithoutPreferences) {
 
 TEST_F(LogTest, CannotBeMadeWithoutPreferences) {
     FactoryByName::forget("Prefs");
-    EXPECT_THROW(Log::instance(), Prefs::NoImplementation);
+    EXPECT_NE(thrown<Prefs::NoImplementation>([] {
+                  Log::instance();
+              }).find("pells::Factory<pells::Prefs"),
+              std::string::npos);
     EXPECT_FALSE(Log::singleton);
     EXPECT_THROW(LogKey("error"), Prefs::NoImplementation);
     EXPECT_FALSE(Prefs::singleton);
@@ -106,6 +111,62 @@ TEST_F(LogTest, KeepsTextBackUntilItIsClosedUnlessToldToFlush) {
     prefs() = {{"log", "*"}};
     PELLS_LOG("app", "third");
     EXPECT_NE(readFile("pells.log").find("app: third\n"), std::string::npos);
+}
+
+/// Logs and gives a text, as a function that a message calls may do.
+std::string nested(int depth) {
+    if (depth > 0)
+        PELLS_LOG("inner", "begin " << nested(depth - 1) << " end");
+    return std::string(2000, static_cast<char>('a' + depth));
+}
+
+TEST_F(LogTest, KeepsAllTextWhereMessagesLogWhileTheyAreEvaluated) {
+    for (const char* const rules : {"* -log.flush", "*"}) {
+        prefs() = {{"log", rules}};
+        PELLS_LOG("outer", "before " << nested(2) << " after");
+        PELLS_LOG("app", "last");
+        Log::instance().close();
+        std::string text = readFile("pells.log");
+        text.erase(0, text.find("outer: "));
+        const auto filling = [](char letter) { return std::string(2000, letter); };
+        EXPECT_EQ(text, "outer: before inner: begin inner: begin " + filling('a') + " end\n" +
+                            filling('b') + " end\n" + filling('c') + " after\napp: last\n")
+            << rules;
+        SingletonList::freeSingletons();
+    }
+}
+
+TEST_F(LogTest, GoesWhereItIsToldAndHearsAgainAfterAMessageThatFailed) {
+    DebuggerText debugger;
+    PELLS_LOG("app", static_cast<const char*>(nullptr) << "lost");
+    PELLS_LOG("app", "heard");
+    Log::instance().close();
+    EXPECT_TRUE(debugger.has("app: heard\n"));
+    for (const std::string name : {"", "other.log"}) {
+        SingletonList::freeSingletons();
+        boost::filesystem::remove("pells.log");
+        Log::setFileName(name);
+        PELLS_LOG("app", "elsewhere");
+        Log::instance().close();
+        EXPECT_EQ(files(), name.empty() ? Lines() : Lines{name});
+    }
+    EXPECT_NE(readFile("other.log").find("app: elsewhere\n"), std::string::npos);
+    Log::setFileName("pells.log");
+}
+
+TEST_F(LogTest, ReadsRulesUpToALimitAndSaysSo) {
+    prefs().clear();
+    EXPECT_EQ(Log::maximumRulesSize(), std::size_t{1} << 20);
+    Log::setMaximumRulesSize(20);
+    scratch.write("pells.log.prefs", "error one\ttwo three-four-five");
+    EXPECT_TRUE(isOn("two"));
+    EXPECT_FALSE(isOn("three"));
+    EXPECT_EQ(logLines(),
+              Lines{"error: pells.log.prefs is longer than 20 bytes; the rest is ignored"});
+    SingletonList::freeSingletons();
+    scratch.write("pells.log.prefs", "error one twenty-one");
+    EXPECT_TRUE(isOn("twenty-one"));
+    EXPECT_EQ(logLines(), Lines());
 }
 
 /// Random numbers in random formats, many of them near the middle between two texts.

@@ -8,6 +8,7 @@
 #include "pells/asset/pell_archive.h"
 #include "pells/image/image_base.h"
 #include "pells/image/image_loaders.h"
+#include "pells/log/log.h"
 #include "pells/serial/serializable.h"
 #include "support/allocations.h"
 #include "support/archive_bytes.h"
@@ -178,6 +179,17 @@ TEST_F(Proportion, OfTokensWhateverIsSkipped) {
             EXPECT_EQ(written.str(), each.token);
         EXPECT_EQ(tokenizer.getToken().type, Token::T_EOF);
     }
+}
+
+TEST_F(Proportion, OfRulesOfTheLog) {
+    pells_test::prefs().clear();
+    std::string rules;
+    for (int i = 0; i < 10000000; ++i)
+        rules += "x ";
+    scratch.write("pells.log.prefs", rules + "late");
+    const AllocationMeter meter;
+    EXPECT_FALSE(pells::Log::instance().isEnabled("late", false));
+    EXPECT_LT(meter.peakBytes(), 64 * MiB);
 }
 
 TEST_F(Proportion, OfAttributes) {

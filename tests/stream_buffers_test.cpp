@@ -105,6 +105,20 @@ TEST(Tee, HidesTheFailureOfOneTarget) {
     EXPECT_FALSE(pells::tee_ostream<>(bad, bad) << "three" << std::flush);
 }
 
+/// Takes no text.
+struct ThrowingSink : pells::platform::DebuggerSink {
+    ThrowingSink() { pells::platform::setDebuggerSink(this); }
+    void write(const char* /*text*/) override { throw std::runtime_error("no debugger"); }
+};
+
+TEST(StreamsThatDie, LoseWhatNobodyTakesAndThrowNothing) {
+    const ThrowingSink sink;
+    std::ostream closed(nullptr);
+    EXPECT_THROW(closed.exceptions(std::ios_base::badbit), std::ios_base::failure);
+    pells::debugostream() << "lost";
+    pells::tee_ostream<>(closed, closed) << "lost, too";
+}
+
 TEST(DebuggerStream, PassesOnWhatIsLeftWhenItDies) {
     const pells_test::DebuggerText debugger;
     pells::debugostream() << std::string(1500, 'x') << 7;

@@ -6,6 +6,7 @@
 #include <unistd.h>
 
 #include <csignal>
+#include <functional>
 
 #include "pells/image/image_fallback_manager.h"
 #include "pells/log/log.h"
@@ -54,6 +55,35 @@ TEST_F(WorldFaults, AWorkingDirectoryThatIsGoneSilencesTheLogFileOnly) {
     EXPECT_EQ(read("name"), "content");
     pells::Log::instance().close();
     EXPECT_TRUE(debugger.has("asset.open: "));
+}
+
+TEST_F(WorldFaults, NothingUnderTheLogsNameBlocksOrIsOverwritten) {
+    scratch.write("precious", "as it was");
+    const std::pair<const char*, std::function<void(const char*)>> obstacles[] = {
+        {"a pipe", [](const char* name) { EXPECT_EQ(mkfifo(name, 0600), 0); }},
+        {"a folder", [](const char* name) { fs::create_directory(name); }},
+        {"a link", [](const char* name) { fs::create_symlink("precious", name); }},
+        {"a link to nothing", [](const char* name) { fs::create_symlink("nothing", name); }},
+        {"a device", [](const char* name) { fs::create_symlink("/dev/zero", name); }}};
+    for (const auto& obstacle : obstacles) {
+        SCOPED_TRACE(obstacle.first);
+        for (const char* const name : {"pells.log", "pells.log.prefs"}) {
+            fs::remove_all(name);
+            obstacle.second(name);
+        }
+        prefs().clear();
+        PELLS_LOG("app", "a site that asks for the rules");
+        pells::SingletonList::freeSingletons();
+        prefs() = {{"log", "*"}};
+        debugger.received.clear();
+        pells::LogKey key("app");
+        pells::Log::instance().beginLine(key) << obstacle.first << '\n';
+        pells::Log::instance().close();
+        EXPECT_TRUE(debugger.has(std::string("app: ") + obstacle.first + '\n'));
+        EXPECT_EQ(readFile("precious"), "as it was");
+        EXPECT_FALSE(fs::exists("nothing"));
+        pells::SingletonList::freeSingletons();
+    }
 }
 
 TEST_F(WorldFaults, FilesThatVanishOrChangeHarmNoOther) {

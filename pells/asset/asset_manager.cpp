@@ -91,8 +91,13 @@ int MemberContainer::alive = 0;
 /// Tells developers of streams that will read from archives that are gone.
 void reportContainersLeft() {
 #ifndef NDEBUG
-    if (MemberContainer::alive != 0)
+    if (MemberContainer::alive == 0)
+        return;
+    try {
         platform::debuggerOutput("Stream containers outlive the asset manager\n");
+    } catch (...) {
+        // The application's sink threw, and a destructor asked.
+    }
 #endif
 }
 

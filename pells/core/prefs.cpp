@@ -14,6 +14,11 @@ Prefs* PrefsFactory::create() {
     return prefs;
 }
 
+const char* Prefs::NoImplementation::what() const noexcept {
+    return "nothing makes the preferences: define a static object, such as "
+           "'const pells::Factory<pells::Prefs, MyPrefs> prefsFactory(\"Prefs\");'";
+}
+
 Prefs::Prefs() = default;
 Prefs::~Prefs() = default;
 

@@ -31,7 +31,11 @@ extern template class PELLS_API Singleton<Prefs, PrefsFactory>;
 class PELLS_API Prefs : public Singleton<Prefs, PrefsFactory> {
 public:
     /// Thrown by instance() when the application registered no factory.
-    class PELLS_API NoImplementation : public std::exception {};
+    class PELLS_API NoImplementation : public std::exception {
+    public:
+        /// Says which factory to define.
+        const char* what() const noexcept override;
+    };
 
     ~Prefs() override;
 

@@ -125,7 +125,11 @@ Singleton<T, F>::Singleton() {
 
 template <class T, class F>
 Singleton<T, F>::~Singleton() {
-    SingletonList::delSingleton(this);
+    try {
+        SingletonList::delSingleton(this);
+    } catch (...) {
+        // There was no list, and no memory for one: nothing to be removed from.
+    }
 }
 
 }  // namespace pells

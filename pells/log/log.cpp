@@ -1,14 +1,14 @@
 #include "pells/log/log.h"
 
+#include <algorithm>
 #include <ctime>
 #include <iomanip>
 #include <sstream>
-#include <vector>
 
 #include "pells/core/no_destructor.h"
 #include "pells/core/prefs.h"
-#include "pells/core/strings.h"
 #include "pells/log/exit_hooks.h"
+#include "pells/log/log_file.h"
 #include "pells/log/number_format.h"
 
 namespace pells {
@@ -27,8 +27,12 @@ public:
     ~LogExitHook() {
         if (!Log::singleton)
             return;
-        Log::singleton->dumpTags();
-        Log::singleton->close();
+        try {
+            Log::singleton->dumpTags();
+            Log::singleton->close();
+        } catch (...) {
+            // There is nobody left to tell.
+        }
     }
 };
 
@@ -43,15 +47,33 @@ public:
 std::uint64_t logsMade = 0;
 
 const char prefsFileName[] = "pells.log.prefs";
+const char separators[] = " \t\n";
 
-std::string readPrefsFile() {
+std::size_t rulesLimit = std::size_t{1024} * 1024;
+
+std::string& fileName() {
+    static NoDestructor<std::string> name("pells.log");
+    return *name;
+}
+
+/// Reads the rules' file as far as the limit allows.
+///
+/// \param cut set when it goes on behind the limit; the last word, which may go on as well, is left
+///            out then.
+std::string readPrefsFile(bool& cut) {
     std::string text;
-    std::ifstream file(prefsFileName);
-    char piece[512];
-    do {
-        file.read(piece, sizeof piece);
-        text.append(piece, static_cast<std::string::size_type>(file.gcount()));
-    } while (file);
+    platform::RegularFile file;
+    if (!file.openToRead(prefsFileName))
+        return text;
+    char piece[4096];
+    std::ptrdiff_t got = 0;
+    while (text.size() <= rulesLimit && (got = file.readAt(text.size(), piece, sizeof piece)) > 0)
+        text.append(piece, static_cast<std::size_t>(got));
+    cut = text.size() > rulesLimit;
+    if (cut) {
+        text.resize(rulesLimit);
+        text.resize(text.find_last_of(separators) + 1);
+    }
     return text;
 }
 
@@ -66,10 +88,27 @@ std::string localTime() {
 
 }  // namespace
 
+const std::string& Log::getFileName() {
+    return fileName();
+}
+
+void Log::setFileName(const std::string& path) {
+    fileName() = path;
+}
+
+std::size_t Log::maximumRulesSize() {
+    return rulesLimit;
+}
+
+void Log::setMaximumRulesSize(std::size_t bytes) {
+    rulesLimit = bytes;
+}
+
 Log::Log()
-    : openMode(std::ios_base::out | std::ios_base::trunc),
+    : rulesWereCut(false),
+      logFile(std::make_unique<LogFile>(fileName())),
       flushEach(false),
-      teeStream(debugStream, logFile),
+      teeStream(debugStream, *logFile),
       serialNumber(++logsMade) {
     // An application that has chosen another locale for its streams finds its forms in the log.
     if (teeStream.getloc() == std::locale::classic())
@@ -87,22 +126,33 @@ void Log::readRules() {
     text += ' ';
     text += Prefs::instance().getString("log");
     if (text == " ")
-        text += readPrefsFile();
+        text += readPrefsFile(rulesWereCut);
 
-    std::vector<std::string> tokens;
-    string_split(text, " \t\n", tokens);
-    for (const std::string& token : tokens) {
-        const bool enabled = token[0] != '-';
-        const bool hasSign = token[0] == '+' || token[0] == '-';
-        const std::string pattern = token.substr(hasSign ? 1 : 0);
-        if (!pattern.empty())
-            rules.emplace_back(enabled, pattern);
+    // One by one, as a list of all words would take many times the memory of the text.
+    std::string::size_type begin = text.find_first_not_of(separators);
+    while (begin != std::string::npos) {
+        const std::string::size_type end =
+            std::min(text.find_first_of(separators, begin), text.size());
+        addRule(text.substr(begin, end - begin));
+        begin = text.find_first_not_of(separators, end);
     }
+}
+
+void Log::addRule(const std::string& word) {
+    const bool enabled = word[0] != '-';
+    const bool hasSign = word[0] == '+' || word[0] == '-';
+    const std::string pattern = word.substr(hasSign ? 1 : 0);
+    if (!pattern.empty())
+        rules.emplace_back(enabled, pattern);
 }
 
 void Log::writeHeader() {
     const std::string line(75, '-');
-    getStream() << line << "\nMirrik Pells - " << localTime() << '\n' << line << '\n';
+    std::ostream& stream = getStream();
+    stream << line << "\nMirrik Pells - " << localTime() << '\n' << line << '\n';
+    if (rulesWereCut && isEnabled("error", false))
+        stream << "error: " << prefsFileName << " is longer than " << rulesLimit
+               << " bytes; the rest is ignored\n";
 }
 
 bool Log::isEnabled(const std::string& tag, bool remember) {
@@ -133,12 +183,11 @@ bool Log::registerTag(const std::string& tag) {
 }
 
 std::ostream& Log::getStream() {
-    // The buffer is opened directly: the stream's own open() would clear the mark of a failure, and
-    // a file that failed once receives no more text.
-    if (!logFile.is_open()) {
-        if (!logFile.rdbuf()->open("pells.log", openMode | std::ios_base::out))
-            logFile.setstate(std::ios_base::failbit);
-        openMode = std::ios_base::out | std::ios_base::app;
+    logFile->open();
+    // A message may have failed, and memory or the debugger may be there again.
+    if (!teeStream || !debugStream) {
+        teeStream.clear();
+        debugStream.clear();
     }
     return teeStream;
 }
@@ -158,8 +207,7 @@ void Log::flush() {
 
 void Log::close() {
     teeStream.flush();
-    if (logFile.is_open())
-        logFile.close();
+    logFile->close();
 }
 
 void Log::dumpTags() {

@@ -1,10 +1,10 @@
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
-#include <fstream>
-#include <ios>
 #include <list>
 #include <map>
+#include <memory>
 #include <new>
 #include <ostream>
 #include <string>
@@ -16,6 +16,7 @@
 namespace pells {
 
 class Log;
+class LogFile;
 class LogKey;
 class RecurringTag;
 extern template class PELLS_API RogueSingleton<Log, SingletonFactory<Log>>;
@@ -27,17 +28,32 @@ extern template class PELLS_API Singleton<Log, SingletonFactory<Log>>;
 /// tag is on. Rules decide: words separated by spaces, tabs and line feeds, each a prefix of tags,
 /// or "*" for all of them, with "-" before it to switch them off; the last rule that fits a tag
 /// wins, and without one the tag is off. The rules are the preference "logdefault" followed by the
-/// preference "log" or, when both are empty, the file "pells.log.prefs" in the current directory.
-/// They are read once, when the log is created.
+/// preference "log" or, when both are empty, the file "pells.log.prefs" in the current directory,
+/// see maximumRulesSize(). They are read once, when the log is created.
 ///
 /// The log is created by the first logging site that runs. When the library is unloaded or the
 /// process exits, a log that still exists lists its tags (dumpTags()) and is closed.
 ///
-/// A log file that cannot be opened or written receives nothing more; the debugger still does. One
-/// thread only.
+/// A log file that cannot be opened or written receives nothing more; the debugger still does. So
+/// it is with one that is no regular file or a symbolic link: nothing that lies under the name by
+/// design or accident makes the program wait, or loses what the link leads to. One thread only.
 class PELLS_API Log : public Singleton<Log, SingletonFactory<Log>> {
 public:
     ~Log() override;
+
+    /// Where the log goes: a path, "pells.log" unless it was set, or "" for no file, so that only
+    /// the debugger gets lines.
+    static const std::string& getFileName();
+
+    /// Takes effect when the next log is made.
+    static void setFileName(const std::string& path);
+
+    /// How much of "pells.log.prefs" is read, in bytes: 1 MiB unless it was set. Of a longer file
+    /// the rest is ignored, from the last separator within the limit on, with a line under "error".
+    static std::size_t maximumRulesSize();
+
+    /// Takes effect when the next log is made.
+    static void setMaximumRulesSize(std::size_t bytes);
 
     /// Whether a tag is on. The first verdict on a tag that is kept is final.
     ///
@@ -47,7 +63,8 @@ public:
     /// isEnabled() that keeps the verdict.
     bool registerTag(const std::string& tag);
 
-    /// The stream to write lines to; (re)opens "pells.log" if it is closed. Stays the log's.
+    /// The stream to write lines to; (re)opens the file if it is closed. Stays the log's. A mark of
+    /// failure that an earlier message left on it is cleared: only the file's own failure lasts.
     std::ostream& getStream();
 
     /// getStream() after writing the beginning of a line to it: the key's tag and ": ".
@@ -77,14 +94,15 @@ private:
     Log();
 
     void readRules();
+    void addRule(const std::string& word);
     void writeHeader();
     bool findVerdict(const std::string& tag) const;
     void writeLine(const LogKey& key, const std::string& message);
 
     std::list<std::pair<bool, std::string>> rules;
     std::map<std::string, TagState> tagTable;
-    std::ofstream logFile;
-    std::ios_base::openmode openMode;
+    bool rulesWereCut;
+    std::unique_ptr<LogFile> logFile;
     bool flushEach;
     debugostream debugStream;
     tee_ostream<> teeStream;

@@ -1,5 +1,7 @@
 #include "pells/log/stream_buffers.h"
 
+#include <cstring>
+
 #include "pells/platform/debugger.h"
 
 namespace pells {
@@ -12,12 +14,16 @@ template class tee_ostreambuf<char>;
 debug_ostreambuf::debug_ostreambuf() = default;
 
 debug_ostreambuf::~debug_ostreambuf() {
-    sync();
+    syncBeforeEnd();
 }
 
 bool debug_ostreambuf::write(char* text, long count) {
-    const std::string piece(text, static_cast<std::string::size_type>(count));
-    platform::debuggerOutput(piece.c_str());
+    // A copy with an end; on the stack, so that lines reach the debugger when memory has run out.
+    char piece[defaultSize + 1];
+    const std::size_t size = static_cast<std::size_t>(count);
+    std::memcpy(piece, text, size);
+    piece[size] = '\0';
+    platform::debuggerOutput(piece);
     return true;
 }
 

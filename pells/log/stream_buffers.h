@@ -20,9 +20,11 @@ public:
     ~simple_streambuf() override;
 
 protected:
+    static constexpr long defaultSize = 1024;
+
     /// \param size characters in the block, at least 1.
     /// \throws std::length_error for a smaller size.
-    explicit simple_streambuf(long size = 1024);
+    explicit simple_streambuf(long size = defaultSize);
 
     long bufferSize() const;
     C* buffer();
@@ -37,7 +39,7 @@ private:
 template <class C = char, class Traits = std::char_traits<C>>
 class PELLS_TEMPLATE_API simple_istreambuf : public simple_streambuf<C, Traits> {
 public:
-    explicit simple_istreambuf(long size = 1024);
+    explicit simple_istreambuf(long size = simple_streambuf<C, Traits>::defaultSize);
 
     /// Stores up to `room` characters and returns their number; 0 or -1 when no more can be read.
     virtual long read(C* into, long room) = 0;
@@ -48,12 +50,12 @@ protected:
 
 /// An output buffer that needs one operation of its subclass: write() takes whole blocks.
 ///
-/// A subclass calls sync() in its destructor, while write() still works, so that pending text is
-/// not lost.
+/// A subclass calls syncBeforeEnd() in its destructor, while write() still works, so that pending
+/// text is not lost.
 template <class C = char, class Traits = std::char_traits<C>>
 class PELLS_TEMPLATE_API simple_ostreambuf : public simple_streambuf<C, Traits> {
 public:
-    explicit simple_ostreambuf(long size = 1024);
+    explicit simple_ostreambuf(long size = simple_streambuf<C, Traits>::defaultSize);
 
 protected:
     /// Writes the pending text; on failure returns -1 and keeps it for the next time.
@@ -71,6 +73,9 @@ protected:
 
     /// Called at the end of every sync() that wrote its text, or had none to write.
     virtual bool xsync();
+
+    /// sync() for destructors, which nothing may leave: text that write() throws at is lost.
+    void syncBeforeEnd() noexcept;
 
     /// Makes the whole block but its last character available; that one takes the character that
     /// overflows.

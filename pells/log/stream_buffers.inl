@@ -108,6 +108,15 @@ bool simple_ostreambuf<C, Traits>::xsync() {
 }
 
 template <class C, class Traits>
+void simple_ostreambuf<C, Traits>::syncBeforeEnd() noexcept {
+    try {
+        sync();
+    } catch (...) {
+        // Whoever could be told is being destroyed.
+    }
+}
+
+template <class C, class Traits>
 void simple_ostreambuf<C, Traits>::emptyBuffer() {
     C* const start = this->buffer();
     this->setp(start, start + this->bufferSize() - 1);
@@ -120,7 +129,7 @@ tee_ostreambuf<C, Traits>::tee_ostreambuf(std::basic_ostream<C, Traits>& firstTa
 
 template <class C, class Traits>
 tee_ostreambuf<C, Traits>::~tee_ostreambuf() {
-    this->sync();
+    this->syncBeforeEnd();
 }
 
 template <class C, class Traits>

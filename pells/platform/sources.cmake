@@ -1,3 +1,2 @@
-pells_sources(platform
-    HEADERS counter.h debugger.h
-    SOURCES counter.cpp debugger.cpp)
+pells_sources(
+    platform HEADERS counter.h debugger.h SOURCES counter.cpp debugger.cpp regular_file.cpp)

@@ -61,8 +61,13 @@ public:
     TimeSummaryHook(const TimeSummaryHook&) = delete;
     TimeSummaryHook& operator=(const TimeSummaryHook&) = delete;
     ~TimeSummaryHook() {
-        if (Log::singleton)
+        if (!Log::singleton)
+            return;
+        try {
             writeTimeSummary();
+        } catch (...) {
+            // There is nobody left to tell.
+        }
     }
 };
 
@@ -108,8 +113,11 @@ inline std::uint32_t Performance::getTimestamp() {
     static const std::uint64_t frequency = platform::counterFrequency();
     const std::uint64_t ticks = platform::counter();
     // Most counters tick in microseconds; dividing 64 bits would cost a good part of a reading.
-    const bool inMicroseconds = frequency == 1000000u;
-    return static_cast<std::uint32_t>(inMicroseconds ? ticks : ticks * 1000000u / frequency);
+    if (frequency == 1000000u)
+        return static_cast<std::uint32_t>(ticks);
+    // The seconds apart: a counter of 10 MHz would leave 64 bits after three weeks.
+    const std::uint64_t fraction = ticks % frequency * 1000000u / frequency;
+    return static_cast<std::uint32_t>(ticks / frequency * 1000000u + fraction);
 }
 
 Performance::Performance(const std::string& label, PerformanceCategory* chargedTo)
@@ -128,8 +136,13 @@ Performance::Performance(const char* label, PerformanceCategory* chargedTo) : ca
 Performance::~Performance() {
     const std::uint32_t now = getTimestamp();
     const std::uint32_t exclusive = PerformanceCategory::pop(now) - categoryTotalAtStart;
-    if (enabled)
+    if (!enabled)
+        return;
+    try {
         logExit(now - startTime, exclusive);
+    } catch (...) {
+        // The line is lost, as memory may have run out; the region that was timed is not.
+    }
 }
 
 void Performance::logEntry(const std::string& label) {

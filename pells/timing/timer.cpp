@@ -25,6 +25,11 @@ Timer* TimerFactory::create(const std::string& name) {
     return AbstractFactory<Timer>::createByName(name);
 }
 
+const char* Timer::NoImplementation::what() const noexcept {
+    return "nothing makes the timer: define a static object, such as "
+           "'const pells::Factory<pells::Timer, MyTimer> timerFactory(\"Timer\");'";
+}
+
 Timer::Timer() = default;
 Timer::~Timer() = default;
 

@@ -32,7 +32,11 @@ extern template class PELLS_API Singleton<Timer, TimerFactory>;
 class PELLS_API Timer : public Singleton<Timer, TimerFactory> {
 public:
     /// Thrown by instance() when the application registered no factory.
-    class PELLS_API NoImplementation : public std::exception {};
+    class PELLS_API NoImplementation : public std::exception {
+    public:
+        /// Says which factory to define.
+        const char* what() const noexcept override;
+    };
 
     /// "Timer": the class name under which the application registers its factory.
     static const std::string TimerName;
