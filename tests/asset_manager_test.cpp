@@ -48,22 +48,25 @@ TEST_F(AssetManagerTest, ServesWhatWasWrittenLast) {
                  1000);
     writeArchive("b.asset", {{"both", "b"}, {"tie", "b"}}, 1000);
     writeArchive("c.asset", {{"both", "c"}}, 1001);
-    writeArchive("d.asset", {{"end", "d"}}, beyond32Bits);
+    writeArchive("d.asset", {{"end", "d"}, {"far", "d"}}, beyond32Bits);
+    writeArchive("e.asset", {{"far", "e"}}, beyond32Bits + 5);
     write("sub/new", "plain", 1001);
     write("sub/old", "plain", 1000);
     write("end", "plain", beyond32Bits + 1);
     write("only", "plain");
 
     const std::pair<const char*, const char*> served[] = {
-        {"both", "c"},     {"sub/new", "plain"}, {"sub/old", "a"}, {"end", "d"},
-        {"only", "plain"}, {"/only", "plain"}};  // the last one below the root, too
+        {"both", "c"}, {"sub/new", "plain"}, {"sub/old", "a"},  {"end", "plain"},
+        {"far", "e"},  {"only", "plain"},    {"/only", "plain"}};  // the last one below the root,
+                                                                   // too
     for (const auto& each : served)
         EXPECT_EQ(read(each.first), each.second) << each.first;
     const Resolution both = manager().resolve("both");
     EXPECT_EQ(both.path, "root/c.asset");
     EXPECT_EQ(both.overridden.size(), 2u);
     EXPECT_FALSE(both.tie);
-    EXPECT_EQ(manager().resolve("end").source, Resolution::ARCHIVE_MEMBER);
+    EXPECT_EQ(manager().resolve("end").source, Resolution::NEWER_FILE);
+    EXPECT_FALSE(manager().resolve("far").tie);
 
     // Between archives of one time the scan decides, and its order is the file system's.
     const Resolution tie = manager().resolve("tie");

@@ -3,6 +3,7 @@
 
 #include <sys/resource.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 #include <csignal>
@@ -107,6 +108,27 @@ TEST_F(WorldFaults, FilesThatVanishOrChangeHarmNoOther) {
     writeArchive("other.asset.new", {{"other", "new"}});
     fs::rename("root/other.asset.new", "root/other.asset");
     EXPECT_EQ(read("other"), "fine");
+}
+
+TEST_F(WorldFaults, AnArchiveThatVanishesDuringTheScanHidesItselfOnly) {
+    Members members;
+    for (int i = 0; i < 20000; ++i)
+        members.emplace_back("member " + std::to_string(i), "");
+    scratch.write("thief", archiveOf(members));
+    writeArchive("a.asset", {{"name", "content"}});
+    prefs()["log"] = "-*";
+    const pid_t child = fork();
+    while (child == 0) {
+        static_cast<void>(link("thief", "root/thief.asset"));
+        usleep(300);
+        unlink("root/thief.asset");
+    }
+    for (int round = 0; round < 50; ++round) {
+        EXPECT_NO_THROW(EXPECT_EQ(read("name"), "content"));
+        pells::SingletonList::freeSingletons();
+    }
+    kill(child, SIGKILL);
+    waitpid(child, nullptr, 0);
 }
 
 TEST_F(WorldFaults, WhatMayNotBeReadHidesItselfOnly) {

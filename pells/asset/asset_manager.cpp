@@ -23,12 +23,6 @@ namespace fs = boost::filesystem;
 
 namespace {
 
-std::int32_t toTimestamp(std::time_t time) {
-    typedef std::numeric_limits<std::int32_t> Limits;
-    return static_cast<std::int32_t>(
-        std::max<std::intmax_t>(Limits::min(), std::min<std::intmax_t>(Limits::max(), time)));
-}
-
 bool endsWith(const std::string& text, const std::string& ending) {
     return text.size() >= ending.size() &&
            text.compare(text.size() - ending.size(), ending.size(), ending) == 0;
@@ -233,21 +227,24 @@ void AssetManager::addArchive(const std::string& path) {
         PELLS_LOG("error", "Bad .asset file: " << path << ": " << reason.what());
         return;
     }
-    const std::int32_t timestamp = toTimestamp(fs::last_write_time(path));
-    archiveTimes.push_back(timestamp);
+    // That of the open file, which may have lost its name since.
+    std::int64_t writeTime = 0;
+    if (!archive->getWriteTime(writeTime))
+        writeTime = fs::last_write_time(path);
+    archiveTimes.push_back(writeTime);
     archives.emplace_back(path, std::move(archive));
-    cacheMembers(*archives.back().second, timestamp);
+    cacheMembers(*archives.back().second, writeTime);
 }
 
-void AssetManager::cacheMembers(pellistream& archive, std::int32_t timestamp) {
+void AssetManager::cacheMembers(pellistream& archive, std::int64_t writeTime) {
     // An archive's names are sorted, too, so most go right behind the one before.
     Cache::iterator place = cache.begin();
     for (const auto& member : archive.getDirectory()) {
         PELLS_LOG("asset.entries", ">>> For this asset file, found entry: " << member.first);
         const Cache::iterator entry = cache.try_emplace(place, member.first);
         place = std::next(entry);
-        if (!entry->second || entry->second->getTimestamp() < timestamp)
-            entry->second.reset(new MemberOpener(member, timestamp, &archive));
+        if (!entry->second || entry->second->getWriteTime() < writeTime)
+            entry->second.reset(new MemberOpener(member, writeTime, &archive));
     }
 }
 
@@ -258,10 +255,10 @@ void AssetManager::preferNewerFiles(const std::string& root) {
             continue;
         const fs::path file = fs::path(root) / entry.first;
         boost::system::error_code error;
-        const std::int32_t timestamp = toTimestamp(fs::last_write_time(file, error));
+        const std::int64_t writeTime = fs::last_write_time(file, error);
         if (!error) {
-            if (timestamp > entry.second->getTimestamp())
-                entry.second.reset(new FileOpener(file.string(), timestamp));
+            if (writeTime > entry.second->getWriteTime())
+                entry.second.reset(new FileOpener(file.string(), writeTime));
         } else if (typeOf(file) != fs::file_not_found) {
             const fs::filesystem_error reason("last_write_time", file, error);
             PELLS_LOG("error",
@@ -407,14 +404,14 @@ AssetManager::Resolution AssetManager::resolve(const std::string& name) const {
         found.source = Resolution::FILE_SYSTEM;
         found.path = assetPath(real).string();
     }
-    const std::int32_t timestamp = cached == cache.end() ? 0 : cached->second->getTimestamp();
+    const std::int64_t writeTime = cached == cache.end() ? 0 : cached->second->getWriteTime();
     for (std::size_t i = 0; cached != cache.end() && i < archives.size(); ++i) {
         const bool serves =
             found.source == Resolution::ARCHIVE_MEMBER && found.path == archives[i].first;
         if (serves || archives[i].second->getDirectory().count(real) == 0)
             continue;
         found.overridden.push_back(archives[i].first);
-        if (found.source == Resolution::ARCHIVE_MEMBER && archiveTimes[i] == timestamp)
+        if (found.source == Resolution::ARCHIVE_MEMBER && archiveTimes[i] == writeTime)
             found.tie = true;
     }
     return found;
@@ -435,13 +432,19 @@ void AssetManager::describe(const Opener& opener, Resolution& found) const {
     }
 }
 
-AssetManager::Opener::Opener(std::string sourceName, std::int32_t sourceTimestamp)
-    : name(std::move(sourceName)), timestamp(sourceTimestamp) {}
+AssetManager::Opener::Opener(const std::string& sourceName, std::int64_t sourceTime)
+    : name(sourceName), writeTime(sourceTime) {}
 
 AssetManager::Opener::~Opener() = default;
 
-AssetManager::FileOpener::FileOpener(std::string path, std::int32_t writeTime)
-    : Opener(std::move(path), writeTime) {}
+std::int32_t AssetManager::Opener::getTimestamp() const {
+    typedef std::numeric_limits<std::int32_t> Limits;
+    const std::int64_t atLeast = std::max<std::int64_t>(writeTime, Limits::min());
+    return static_cast<std::int32_t>(std::min<std::int64_t>(atLeast, Limits::max()));
+}
+
+AssetManager::FileOpener::FileOpener(std::string filePath, std::int64_t sourceTime)
+    : Opener(path, sourceTime), path(std::move(filePath)) {}
 
 AssetManager::FileOpener::~FileOpener() = default;
 
@@ -455,8 +458,8 @@ boost::intrusive_ptr<baseiStreamContainer> AssetManager::FileOpener::open(bool /
 }
 
 AssetManager::MemberOpener::MemberOpener(const pellistream::Directory::value_type& entry,
-                                         std::int32_t writeTime, pellistream* openArchive)
-    : Opener(entry.first, writeTime), archive(openArchive), member(&entry) {}
+                                         std::int64_t sourceTime, pellistream* openArchive)
+    : Opener(entry.first, sourceTime), archive(openArchive), member(&entry) {}
 
 AssetManager::MemberOpener::~MemberOpener() = default;
 

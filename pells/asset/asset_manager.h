@@ -129,7 +129,7 @@ private:
 
     void scanRoot(const std::string& root);
     void addArchive(const std::string& path);
-    void cacheMembers(pellistream& archive, std::int32_t timestamp);
+    void cacheMembers(pellistream& archive, std::int64_t writeTime);
     void preferNewerFiles(const std::string& root);
     void buildAliases();
 
@@ -153,7 +153,7 @@ private:
     std::unique_ptr<CacheIndex> cacheIndex;
     std::map<std::string, std::string> aliases;
     /// Last-write time of each archive.
-    std::vector<std::int32_t> archiveTimes;
+    std::vector<std::int64_t> archiveTimes;
 };
 
 /// Where one asset lies and how it is opened.
@@ -164,35 +164,42 @@ public:
     /// The path of a file, or the name of a member in its archive.
     const std::string& getName() const { return name; }
 
-    /// When the file or the archive was last written, in seconds since 1970; later times than 32
-    /// bits can tell count as the last one of them. 0 for files that were not looked at.
-    std::int32_t getTimestamp() const { return timestamp; }
+    /// When the file or the archive was last written, in seconds since 1970. 0 for files that were
+    /// not looked at.
+    std::int64_t getWriteTime() const { return writeTime; }
+
+    /// The same in 32 bits: times beyond them are the first or the last one that they can tell.
+    std::int32_t getTimestamp() const;
 
     /// Opens the asset; null when that cannot be done. The flag means nothing here.
     virtual boost::intrusive_ptr<baseiStreamContainer> open(bool flag) = 0;
 
 protected:
-    Opener(std::string sourceName, std::int32_t sourceTimestamp);
+    /// \param sourceName outlives the opener; may be a member of the derived class.
+    Opener(const std::string& sourceName, std::int64_t sourceTime);
 
 private:
-    std::string name;
-    std::int32_t timestamp;
+    const std::string& name;
+    std::int64_t writeTime;
 };
 
 /// Opens a plain file. One that cannot be opened leaves a line under "error".
 class PELLS_API AssetManager::FileOpener : public AssetManager::Opener {
 public:
-    FileOpener(std::string path, std::int32_t writeTime);
+    FileOpener(std::string filePath, std::int64_t sourceTime);
     ~FileOpener() override;
 
     boost::intrusive_ptr<baseiStreamContainer> open(bool flag) override;
+
+private:
+    const std::string path;
 };
 
 /// Selects a member of an archive, which outlives the opener and its containers.
 class PELLS_API AssetManager::MemberOpener : public AssetManager::Opener {
 public:
     /// \param entry of the archive's directory.
-    MemberOpener(const pellistream::Directory::value_type& entry, std::int32_t writeTime,
+    MemberOpener(const pellistream::Directory::value_type& entry, std::int64_t sourceTime,
                  pellistream* openArchive);
     ~MemberOpener() override;
 

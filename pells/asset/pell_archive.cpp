@@ -1,15 +1,13 @@
 #include "pells/asset/pell_archive.h"
 
 #include <algorithm>
-#include <boost/filesystem/operations.hpp>
 #include <cstring>
-#include <fstream>
 #include <limits>
 #include <locale>
 #include <sstream>
 
+#include "pells/asset/archive_file.h"
 #include "pells/asset/pell_directory.h"
-#include "pells/asset/regular_file.h"
 #include "pells/core/version.h"
 
 namespace pells {
@@ -33,7 +31,7 @@ const long largeBlock = 256L * 1024;
 
 /// The same for one who takes small pieces but has taken more than a glance.
 const long smallBlock = 32L * 1024;
-const uLong glance = 4096;
+const std::uint64_t glance = 4096;
 
 bool isFailure(int zlibResult) {
     return zlibResult != Z_OK && zlibResult != Z_STREAM_END;
@@ -43,21 +41,6 @@ const Version& currentVersion() {
     static const Version version("1.0");
     return version;
 }
-
-/// The file of an archive, with a buffer so small that seeking to a member and reading it costs no
-/// more than the member's bytes.
-class ArchiveFile : public std::ifstream {
-public:
-    explicit ArchiveFile(const std::string& path) {
-        // Numbers in archives do not follow the user's country.
-        imbue(std::locale::classic());
-        rdbuf()->pubsetbuf(smallBuffer, sizeof smallBuffer);
-        openRegularFile(*this, path);
-    }
-
-private:
-    char smallBuffer[512];
-};
 
 }  // namespace
 
@@ -103,10 +86,12 @@ basic_pellibuf<C, Traits>::basic_pellibuf(const std::string& path)
       basic_pellbuf<std::istream>(new ArchiveFile(path), true),
       inflater(nullptr, 0, 15, nullptr, nullptr, nullptr),
       remaining(0),
+      produced(0),
       ahead(nullptr),
       aheadCount(0),
       nextInflated(nullptr),
       inflatedCount(0),
+      heldBack(0),
       selected{},
       careful(false) {
     static_assert(sizeof(C) == 1 && sizeof inputBuffer == blockSize, "members are bytes");
@@ -117,7 +102,20 @@ basic_pellibuf<C, Traits>::basic_pellibuf(const std::string& path)
 }
 
 template <class C, class Traits>
-basic_pellibuf<C, Traits>::~basic_pellibuf() noexcept = default;
+basic_pellibuf<C, Traits>::~basic_pellibuf() noexcept try {
+} catch (...) {
+    // The inflater throws, after a line in the log, when zlib finds its stream inconsistent.
+    return;
+}
+
+template <class C, class Traits>
+bool basic_pellibuf<C, Traits>::getWriteTime(std::int64_t& seconds) const {
+    platform::RegularFile::Identity identity{};
+    if (!static_cast<const ArchiveFile&>(*stream).getFile().identify(identity))
+        return false;
+    seconds = identity.writeTime;
+    return true;
+}
 
 template <class C, class Traits>
 void basic_pellibuf<C, Traits>::readHeader() {
@@ -195,6 +193,8 @@ void basic_pellibuf<C, Traits>::restart() {
     remaining = selected.length;
     aheadCount = 0;
     inflatedCount = 0;
+    heldBack = 0;
+    produced = 0;
     inflateReset(&inflater);
     inflater.next_in = nullptr;
     inflater.avail_in = 0;
@@ -204,17 +204,29 @@ template <class C, class Traits>
 long basic_pellibuf<C, Traits>::read(C* into, long room) {
     if (room <= 0)
         return 0;
-    if (inflatedCount == 0)
-        inflateAhead(room);
+    int result = inflatedCount <= heldBack ? inflateAhead(room) : Z_OK;
+    long count = 0;
+    if (inflatedCount == 0 && !isFailure(result))
+        count = inflateExactly(into, room, result);
     if (inflatedCount != 0)
         return takeInflated(into, room);
-    int result = Z_OK;
-    const long count = inflateSome(into, room, result);
     if (isFailure(result)) {
         inflater.check("read(): bad pell data stream for member '" + memberName + "'", result,
                        Z_STREAM_END, Z_OK);
     }
     return count;
+}
+
+/// Inflates for one read, straight into the reader's memory. Where that fails, the rest of what was
+/// read ahead may have been in the way: then the member is read in blocks from its start.
+template <class C, class Traits>
+long basic_pellibuf<C, Traits>::inflateExactly(C* into, long room, int& result) {
+    const std::uint64_t position = produced;
+    const long count = inflateSome(into, room, result);
+    if (!isFailure(result) || careful || room > this->bufferSize())
+        return count;
+    result = returnTo(position, room);
+    return inflatedCount != 0 || isFailure(result) ? 0 : inflateSome(into, room, result);
 }
 
 /// Inflates until there is some output; none means the member's end or a failure of zlib.
@@ -233,53 +245,92 @@ long basic_pellibuf<C, Traits>::inflateSome(C* into, long room, int& result) {
         }
         result = inflate(&inflater, Z_NO_FLUSH);
     } while ((result == Z_OK || result == Z_BUF_ERROR) && inflater.avail_out == space);
+    produced += space - inflater.avail_out;
     return static_cast<long>(space - inflater.avail_out);
 }
 
-/// Inflates a block of which the next reads are served, if that pays for reads of that size.
+/// Whether it pays to inflate more than a read of that size takes.
 template <class C, class Traits>
-void basic_pellibuf<C, Traits>::inflateAhead(long room) {
-    const std::uint64_t rest = std::uint64_t{remaining} + aheadCount + inflater.avail_in;
-    const std::uint64_t severalReads = 4 * static_cast<std::uint64_t>(room);
-    const bool small = room <= this->bufferSize();
+bool basic_pellibuf<C, Traits>::paysAhead(long room) const {
     // Who takes small pieces may want no more than a look at the first bytes.
-    const bool mayStop = small && inflater.total_out < glance;
-    if (careful || mayStop || room >= largeBlock || rest < severalReads)
-        return;
-    const uLong position = inflater.total_out;
-    const long size =
-        static_cast<long>(std::min<std::uint64_t>(4 * rest, small ? smallBlock : largeBlock));
-    if (inflated.size() < static_cast<std::size_t>(size))
-        inflated.resize(static_cast<std::size_t>(size));
-    int result = Z_OK;
-    inflatedCount = inflateSome(inflated.data(), size, result);
-    nextInflated = inflated.data();
-    if (isFailure(result))
-        returnTo(position, room);
+    const bool mayStop = room <= this->bufferSize() && produced < glance;
+    const std::uint64_t severalReads = 4 * static_cast<std::uint64_t>(room);
+    return !careful && !mayStop && room < largeBlock && storedRest() >= severalReads;
 }
 
-/// Goes back to a place in a damaged member, in pieces as the reader asks for them, and inflates
-/// nothing ahead any more: the pieces before the damaged one are served as if nothing had been.
+/// Inflates a block of which the next reads are served, behind what was held back of the last one.
+///
+/// \return a failure of zlib that the next read is to report, if there is one.
 template <class C, class Traits>
-void basic_pellibuf<C, Traits>::returnTo(uLong position, long room) {
-    restart();
-    careful = true;
+int basic_pellibuf<C, Traits>::inflateAhead(long room) {
+    const bool small = room <= this->bufferSize();
+    if (inflatedCount == 0 ? !paysAhead(room) : !small) {
+        heldBack = 0;
+        return Z_OK;
+    }
+    const std::uint64_t position = produced - static_cast<std::uint64_t>(inflatedCount);
+    std::copy(nextInflated, nextInflated + inflatedCount, inflated.begin());
+    const std::uint64_t wanted =
+        std::max<std::uint64_t>(4 * storedRest(), static_cast<std::uint64_t>(this->bufferSize()));
+    const long most = small ? smallBlock : largeBlock;
+    const std::size_t size = static_cast<std::size_t>(
+        inflatedCount + static_cast<long>(std::min(wanted, static_cast<std::uint64_t>(most))));
+    if (inflated.size() < size)
+        inflated.resize(size);
+    nextInflated = inflated.data();
+    const bool good = inflateBlock(size, small ? this->bufferSize() : 0);
+    return good ? Z_OK : returnTo(position, room);
+}
+
+/// \param held how much of the block waits for the next one, unless the member ends: what a reader
+///             is served must not reach into the piece that a damage behind the block loses.
+/// \return false for damage.
+template <class C, class Traits>
+bool basic_pellibuf<C, Traits>::inflateBlock(std::size_t size, long held) {
     int result = Z_OK;
     long count = 1;
-    while (inflater.total_out < position && count != 0 && !isFailure(result)) {
+    try {
+        while (count != 0 && inflatedCount <= held && !isFailure(result)) {
+            const long room = static_cast<long>(size) - inflatedCount;
+            count = inflateSome(inflated.data() + inflatedCount, room, result);
+            inflatedCount += count;
+        }
+    } catch (const BadPellFile&) {
+        return false;
+    }
+    heldBack = count != 0 ? held : 0;
+    return !isFailure(result);
+}
+
+/// Goes back to a place in a damaged member, in blocks of input and pieces as the reader asks for
+/// them, and inflates nothing ahead any more: the pieces before the damaged one are served as if
+/// nothing had been.
+///
+/// \return the result of the piece that reaches the place: a failure has lost what it inflated.
+template <class C, class Traits>
+int basic_pellibuf<C, Traits>::returnTo(std::uint64_t position, long room) {
+    restart();
+    careful = true;
+    const std::size_t largestPiece = static_cast<std::size_t>(std::max(room, this->bufferSize()));
+    if (inflated.size() < largestPiece)
+        inflated.resize(largestPiece);
+    int result = Z_OK;
+    long count = 1;
+    while (produced < position && count != 0 && !isFailure(result)) {
         // Before the first piece there is no character that could be put back.
-        const long piece = inflater.total_out == 0 ? std::max(room, this->bufferSize()) : room;
+        const long piece = produced == 0 ? std::max(room, this->bufferSize()) : room;
         count = inflateSome(inflated.data(), piece, result);
     }
-    if (inflater.total_out > position && !isFailure(result)) {
-        inflatedCount = static_cast<long>(inflater.total_out - position);
+    if (produced > position && !isFailure(result)) {
+        inflatedCount = static_cast<long>(produced - position);
         nextInflated = inflated.data() + (count - inflatedCount);
     }
+    return result;
 }
 
 template <class C, class Traits>
 long basic_pellibuf<C, Traits>::takeInflated(C* into, long room) {
-    const long count = std::min(room, inflatedCount);
+    const long count = std::min(room, inflatedCount - heldBack);
     Traits::copy(into, nextInflated, static_cast<std::size_t>(count));
     nextInflated += count;
     inflatedCount -= count;
@@ -365,6 +416,11 @@ template <class C, class Traits>
 void basic_pellistream<C, Traits>::open(const typename Directory::value_type& entry) {
     this->clear();
     this->ownBuffer().open(entry);
+}
+
+template <class C, class Traits>
+bool basic_pellistream<C, Traits>::getWriteTime(std::int64_t& seconds) const {
+    return this->ownBuffer().getWriteTime(seconds);
 }
 
 template <class C, class Traits>

@@ -99,6 +99,9 @@ public:
     explicit basic_pellibuf(const std::string& path);
     ~basic_pellibuf() noexcept override;
 
+    /// See basic_pellistream::getWriteTime().
+    bool getWriteTime(std::int64_t& seconds) const;
+
     /// Selects a member; see basic_pellistream::open().
     bool open(const std::string& member);
     void open(const Directory::value_type& entry);
@@ -119,9 +122,15 @@ private:
     void readHeader();
     void select(const Entry& entry);
     void restart();
+    std::uint64_t storedRest() const {
+        return std::uint64_t{remaining} + aheadCount + inflater.avail_in;
+    }
     long inflateSome(C* into, long room, int& result);
-    void inflateAhead(long room);
-    void returnTo(uLong position, long room);
+    long inflateExactly(C* into, long room, int& result);
+    bool paysAhead(long room) const;
+    int inflateAhead(long room);
+    bool inflateBlock(std::size_t size, long held);
+    int returnTo(std::uint64_t position, long room);
     long takeInflated(C* into, long room);
     bool refill(bool wide);
     void fetch(bool wide);
@@ -129,6 +138,8 @@ private:
     char inputBuffer[1024];
     ZlibInflater inflater;
     std::uint32_t remaining;
+    /// Bytes of the member that were inflated, in more bits than zlib counts with everywhere.
+    std::uint64_t produced;
     std::vector<char> window;
     const char* ahead;
     std::uint32_t aheadCount;
@@ -137,6 +148,8 @@ private:
     std::vector<C> inflated;
     const C* nextInflated;
     long inflatedCount;
+    /// How many of them, the last ones, wait for the next block.
+    long heldBack;
 
     Entry selected;
     bool careful;  ///< the member is damaged
@@ -184,6 +197,10 @@ public:
     ///
     /// \param entry of this archive's getDirectory().
     void open(const typename Directory::value_type& entry);
+
+    /// When the archive was last written, in seconds since 1970: the file that is open, whatever
+    /// lies under its name by now. False when the system does not tell.
+    bool getWriteTime(std::int64_t& seconds) const;
 
     /// The member names in ascending order.
     const_iterator begin() const;

@@ -12,11 +12,12 @@
 namespace pells_test {
 
 /// A zlib stream of the bytes.
-inline std::string deflated(const std::string& bytes) {
+inline std::string deflated(const std::string& bytes, int level = Z_DEFAULT_COMPRESSION) {
     uLongf size = compressBound(static_cast<uLong>(bytes.size()));
     std::string stream(size, '\0');
-    compress(reinterpret_cast<Bytef*>(&stream[0]), &size,
-             reinterpret_cast<const Bytef*>(bytes.data()), static_cast<uLong>(bytes.size()));
+    compress2(reinterpret_cast<Bytef*>(&stream[0]), &size,
+              reinterpret_cast<const Bytef*>(bytes.data()), static_cast<uLong>(bytes.size()),
+              level);
     stream.resize(size);
     return stream;
 }
