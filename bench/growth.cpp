@@ -278,6 +278,10 @@ void addTrees() {
         members.emplace_back(folder + "x", "");
         return members;
     });
+    addAliases("folders of one long name", 1000, [](std::int64_t size) {
+        const std::string folder(250, 'd');
+        return Members{{"f", ""}, {repeated(folder + "*/", size / 20) + "x", ""}};
+    });
     // Links of the file system from each folder to the root and to its parent.
     addWork("links in circles", 100, [](std::int64_t size) {
         const std::string root = bench::scratch() + "/circles";

@@ -145,6 +145,26 @@ TEST_F(Proportion, OfAliasesThatDoubleWithEveryLevel) {
     }
 }
 
+TEST_F(Proportion, OfFoldersThatOnlyLongNamesGoThrough) {
+    const std::string component(250, 'c');
+    std::vector<std::pair<std::string, std::string>> members = {{".symlinks", "link>0\n"}};
+    std::size_t nameBytes = 0;
+    for (int chain = 0; chain < 30; ++chain) {
+        std::string name = std::to_string(chain / 15) + '/' + std::to_string(chain);
+        for (int depth = 0; depth < 260; ++depth)
+            name += '/' + component;
+        nameBytes += name.size();
+        members.emplace_back(name, "");
+    }
+    scratch.write("root/a.asset", pells_test::archiveOf(members));
+    pells_test::prefs() = {{"log", "error"}, {"assetLocation", "root"}};
+    const AllocationMeter meter;
+    EXPECT_TRUE(pells::AssetManager::instance().isFile(members.back().first));
+    EXPECT_LT(meter.peakBytes(), std::int64_t(30 * nameBytes));
+    pells::SingletonList::freeSingletons();
+    EXPECT_LT(pells_test::readFile("pells.log").size(), 10 * nameBytes);
+}
+
 TEST_F(Proportion, OfTokensWhateverIsSkipped) {
     const char single[] = "Token: 1 (T_SINGLE) <a/>";
     const struct {

@@ -67,7 +67,14 @@ struct AssetManager::DirNode {
 /// What a walk over the folders remembers: the folders that it is in, and how much more it may do.
 class AssetManager::FolderWalk {
 public:
-    FolderWalk() { chain.push_back(Folder{assetPath(""), true, false, false, false}); }
+    /// What a folder or a member counts for beside its name.
+    static constexpr std::uint64_t nameOverhead = 32;
+
+    /// \param nameBytes characters in the names of all members, and a few more for each.
+    explicit FolderWalk(std::uint64_t nameBytes)
+        : pathsLeft(pathsPerByte * nameBytes + inProportion(pathsPerByte)) {
+        chain.push_back(Folder{assetPath(""), true, false, false, false});
+    }
 
     /// Goes into a child of the current folder; false when that is not to be searched.
     ///
@@ -87,7 +94,7 @@ public:
             child.behindLink = child.behindLink || mayLeadBack(child.real, name);
             child.onDisk = !child.behindLink || (!isEntered(child.real) && payForLinkedFolder());
         }
-        if (!child.onDisk && !inArchives)
+        if (!child.onDisk && (!inArchives || !payForPath(path)))
             return false;
         chain.push_back(child);
         return true;
@@ -155,6 +162,20 @@ private:
         return true;
     }
 
+    /// Pays for a folder that only archives have: one long name of a member goes through many
+    /// folders, whose paths are each nearly as long.
+    bool payForPath(const std::string& path) {
+        const std::uint64_t price = path.size() + nameOverhead;
+        if (price <= pathsLeft) {
+            pathsLeft -= price;
+            return true;
+        }
+        if (pathsLeft != 0)
+            PELLS_LOG("error", "Too long paths of folders in archives to look for aliases in all");
+        pathsLeft = 0;
+        return false;
+    }
+
     void reportDepth(const std::string& path) {
         if (!depthReported)
             PELLS_LOG("error", "Folder is nested too deeply to look for aliases: " << path);
@@ -180,14 +201,18 @@ private:
     /// A multiple of the limit, for its kind of text.
     std::uint64_t inProportion(std::uint64_t bytesPerAlias) const {
         const std::uint64_t most = std::numeric_limits<std::uint32_t>::max();
-        return std::min<std::uint64_t>(limit, most) * bytesPerAlias + (std::uint64_t{1} << 20);
+        return std::min<std::uint64_t>(limit, most) * bytesPerAlias + fixedText;
     }
+
+    static constexpr std::uint64_t fixedText = std::uint64_t{1} << 20;
+    static constexpr std::uint64_t pathsPerByte = 4;
 
     std::vector<Folder> chain;
     const std::size_t limit = aliasLimit;
     std::uint64_t textLeft = inProportion(128);
     std::uint64_t namesLeft = inProportion(512);
     std::uint64_t linkedFoldersLeft = limit / 50 + 1000;
+    std::uint64_t pathsLeft;
     bool depthReported = false;
     bool excessReported = false;
 };
@@ -201,7 +226,10 @@ void AssetManager::setAliasLimit(std::size_t names) {
 }
 
 void AssetManager::buildAliases() {
-    FolderWalk walk;
+    std::uint64_t nameBytes = 0;
+    for (const Cache::value_type& entry : cache)
+        nameBytes += entry.first.size() + FolderWalk::nameOverhead;
+    FolderWalk walk(nameBytes);
     buildAliasMap(buildDirTree("", "", "", walk), "", false, walk);
 }
 
