@@ -122,6 +122,7 @@ TEST_F(WorldFaults, AnArchiveThatVanishesDuringTheScanHidesItselfOnly) {
         static_cast<void>(link("thief", "root/thief.asset"));
         usleep(300);
         unlink("root/thief.asset");
+        usleep(300);
     }
     for (int round = 0; round < 50; ++round) {
         EXPECT_NO_THROW(EXPECT_EQ(read("name"), "content"));
