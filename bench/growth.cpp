@@ -5,11 +5,13 @@
 
 #include <boost/filesystem.hpp>
 #include <boost/lexical_cast/bad_lexical_cast.hpp>
+#include <chrono>
 #include <climits>
 #include <fstream>
 #include <functional>
 #include <sstream>
 #include <string>
+#include <thread>
 #include <utility>
 #include <vector>
 
@@ -204,6 +206,26 @@ void writeFile(const std::string& path, const std::string& bytes) {
     std::ofstream(path, std::ios_base::binary) << bytes;
 }
 
+/// Loads a picture from an archive as often as that has members.
+void addPicturesOfOneArchive() {
+    addWork("pictures of one archive", 200, [](std::int64_t size) {
+        const std::string path = bench::scratch() + "/pictures.pell";
+        Members members = {{"tga", pells_test::tgaFile(1, 1, 24)}};
+        for (std::int64_t i = 0; i < size; ++i)
+            members.emplace_back("member " + std::to_string(i), "");
+        writeFile(path, pells_test::archiveOf(members));
+        // Files that were just written are not remembered.
+        std::this_thread::sleep_for(std::chrono::seconds(4));
+        return [path, size] {
+            pells::Image_base image(1, 1);
+            bool loaded = true;
+            for (std::int64_t i = 0; i < size; ++i)
+                loaded = pells::PellTGAFileLoader(path.c_str()).uploadImage(&image) && loaded;
+            return loaded;
+        };
+    });
+}
+
 /// An archive that repeats an entry in its directory; all of its members are opened.
 void addDirectory(const std::string& work, std::int64_t least, const std::string& entry) {
     addWork(work, least, [entry](std::int64_t size) {
@@ -337,6 +359,7 @@ void addBenchmarks() {
     addDocuments();
     addHistories();
     addPictures();
+    addPicturesOfOneArchive();
     addArchives();
     addTrees();
     addText();

@@ -1,5 +1,9 @@
 #include "pells/image/image_loaders.h"
 
+#include <chrono>
+#include <cstdio>
+#include <thread>
+
 #include "pells/core/factory.h"
 #include "pells/image/image_base.h"
 #include "pells/image/image_fallback_manager.h"
@@ -65,6 +69,34 @@ TEST_F(ImageLoading, ByDerivedClassesGivesThePictureOrTheSubstitute) {
     EXPECT_TRUE(logged(
         "Image(far.tga): Can't read image: Can't read pell data stream for member 'far.tga'"));
     EXPECT_FALSE(logged("Image(bad.tga)")) << "zlib logged its error itself";
+}
+
+// What is remembered of a file that is old enough serves for just that file in that state.
+TEST_F(ImageLoading, FromAnArchiveAgainAndAgainSeesEveryChange) {
+    const auto archive = [](int width, const std::string& member = "tga") {
+        return archiveOf(
+            {{"before", noise(static_cast<std::size_t>(width))}, {member, tgaFile(width, 1, 24)}});
+    };
+    const auto widthNow = [this] {
+        return PellTGAFileLoader("a.pell").uploadImage(&image) ? image.getWidth() : 0;
+    };
+    const auto expectRepeatedly = [&](int width) {
+        EXPECT_EQ(widthNow(), width);
+        std::this_thread::sleep_for(std::chrono::seconds(4));
+        for (int i = 0; i < 3; ++i)
+            EXPECT_EQ(widthNow(), width);
+    };
+    scratch.write("a.pell", archive(11));
+    expectRepeatedly(11);
+    scratch.write("new.pell", archive(12));
+    std::rename("new.pell", "a.pell");
+    EXPECT_EQ(widthNow(), 12);
+    scratch.write("a.pell", archive(13, "xyz"));
+    expectRepeatedly(0);
+    EXPECT_TRUE(logged("tga file shorter than header (0 bytes)"));
+    std::remove("a.pell");
+    EXPECT_EQ(widthNow(), 0);
+    EXPECT_TRUE(logged("Image(a.pell): Can't read pell file: Can't open pell file"));
 }
 
 TEST_F(ImageLoading, FromArchivesSaysWhyItFailed) {

@@ -82,8 +82,17 @@ basic_pellibuf<C, Traits>::BadPellFile::~BadPellFile() = default;
 
 template <class C, class Traits>
 basic_pellibuf<C, Traits>::basic_pellibuf(const std::string& path)
+    : basic_pellibuf(std::make_unique<ArchiveFile>(path), Directory()) {
+    if (stream->fail())
+        throw BadPellFile("Can't open pell file");
+    readHeader();
+    readPellDirectory(*stream, directory);
+}
+
+template <class C, class Traits>
+basic_pellibuf<C, Traits>::basic_pellibuf(std::unique_ptr<std::istream> file, Directory&& known)
     : simple_istreambuf<C, Traits>(1024),
-      basic_pellbuf<std::istream>(new ArchiveFile(path), true),
+      basic_pellbuf<std::istream>(file.release(), true),
       inflater(nullptr, 0, 15, nullptr, nullptr, nullptr),
       remaining(0),
       produced(0),
@@ -95,10 +104,7 @@ basic_pellibuf<C, Traits>::basic_pellibuf(const std::string& path)
       selected{},
       careful(false) {
     static_assert(sizeof(C) == 1 && sizeof inputBuffer == blockSize, "members are bytes");
-    if (stream->fail())
-        throw BadPellFile("Can't open pell file");
-    readHeader();
-    readPellDirectory(*stream, directory);
+    directory.swap(known);
 }
 
 template <class C, class Traits>
@@ -399,7 +405,11 @@ template class simple_istream<char, std::char_traits<char>, basic_pellibuf<char>
 
 template <class C, class Traits>
 basic_pellistream<C, Traits>::basic_pellistream(const std::string& path)
-    : simple_istream<C, Traits, Buffer>(new Buffer(path)) {
+    : basic_pellistream(new Buffer(path)) {}
+
+template <class C, class Traits>
+basic_pellistream<C, Traits>::basic_pellistream(Buffer* ownBuffer)
+    : simple_istream<C, Traits, Buffer>(ownBuffer) {
     this->exceptions(std::ios_base::badbit);
 }
 

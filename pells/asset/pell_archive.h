@@ -5,6 +5,7 @@
 #include <ios>
 #include <istream>
 #include <map>
+#include <memory>
 #include <stdexcept>
 #include <string>
 #include <vector>
@@ -115,6 +116,11 @@ public:
     long read(C* into, long room) override;
 
 protected:
+    /// Reads members of an archive whose directory is known.
+    ///
+    /// \param file of the library's own class for archives.
+    basic_pellibuf(std::unique_ptr<std::istream> file, Directory&& known);
+
     /// Inflates straight into the reader's memory where that is larger than the own buffer.
     std::streamsize xsgetn(C* to, std::streamsize count) override;
 
@@ -211,6 +217,10 @@ public:
 
     /// The name that selected the member as it was asked for, or "" without one.
     const std::string& getMemberName() const;
+
+protected:
+    /// Takes over a buffer made with new.
+    explicit basic_pellistream(Buffer* ownBuffer);
 };
 
 extern template class PELLS_API basic_pellistream<char>;

@@ -5,6 +5,7 @@
 #include <utility>
 
 #include "pells/asset/asset_manager.h"
+#include "pells/asset/known_archive.h"
 #include "pells/asset/pell_archive.h"
 #include "pells/core/factory.h"
 #include "pells/image/loader_factories.h"
@@ -66,10 +67,8 @@ bool PellTGAFileLoader::uploadImage(Image_base* image) {
     if (fileName.empty() || !image)
         return false;
     try {
-        pellistream archive(fileName);
         // Without such a member the stream is empty, which the reader reports.
-        static_cast<void>(archive.open("tga"));
-        return loadTarga(image, archive);
+        return loadTarga(image, *openKnownMember(fileName, "tga"));
     } catch (const pellibuf::BadPellFile& failure) {
         PELLS_LOG("error", prefix << "Can't read pell file: " << failure.what());
     } catch (const std::exception& failure) {
