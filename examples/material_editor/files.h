@@ -20,8 +20,8 @@ void fromXml(std::istream& in, const std::string& rootName, pells::Serializable&
 /// fromXml() on a file. What is thrown begins with the file's name.
 void readFile(const std::string& path, const std::string& rootName, pells::Serializable& object);
 
-/// Writes a file, or replaces one, in whole or not at all: the text goes to a new file beside it,
-/// which then takes the name. A symbolic link stays, and what it points to is replaced.
+/// Writes a file, or replaces one, in whole or not at all, also where the power fails: see
+/// pells::kit::AtomicFile. A symbolic link stays, and what it points to is replaced.
 ///
 /// \throws std::runtime_error when that fails; the file is then as it was.
 void writeFile(const std::string& path, const std::string& text);
