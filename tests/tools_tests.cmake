@@ -4,6 +4,10 @@ endif()
 
 pells_add_test(archive_writer_test SOURCES archive_writer_test.cpp LIBRARIES pells_archive_writer)
 
+pells_add_test(pack_test SOURCES pack_test.cpp LIBRARIES pells_archive_writer pells::kit Boost::filesystem)
+target_compile_definitions(pack_test PRIVATE PELLS_TOOL="$<TARGET_FILE:pells_tool>")
+add_dependencies(pack_test pells_tool)
+
 pells_add_test(sphere_test SOURCES sphere_test.cpp ../tools/sphere.cpp ../tools/thumbnail.cpp)
 
 # Runs the tool.

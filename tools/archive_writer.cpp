@@ -3,17 +3,13 @@
 #include <zlib.h>
 
 #include <algorithm>
-#include <boost/filesystem/operations.hpp>
-#include <boost/filesystem/path.hpp>
-#include <cerrno>
-#include <cstdio>
 #include <istream>
 #include <new>
 #include <vector>
 
-namespace pells {
+#include "tools/folder_files.h"
 
-namespace fs = boost::filesystem;
+namespace pells {
 
 namespace {
 
@@ -27,35 +23,6 @@ std::string hexadecimal(std::uint64_t number, std::size_t digits = 1) {
     for (; number != 0 || text.size() < digits; number /= 16)
         text.insert(text.begin(), "0123456789abcdef"[number % 16]);
     return text;
-}
-
-std::string withoutTrailingSlashes(std::string path) {
-    while (path.size() > 1 && path.back() == '/')
-        path.pop_back();
-    return path;
-}
-
-bool liesBelow(const fs::path& path, const fs::path& folder) {
-    const auto difference = std::mismatch(folder.begin(), folder.end(), path.begin(), path.end());
-    return difference.first == folder.end();
-}
-
-/// Why a file below a folder cannot be stored; empty when it can.
-std::string obstacle(const fs::path& path, const fs::path& realFolder) {
-    const fs::file_type type = fs::symlink_status(path).type();
-    if (type == fs::regular_file)
-        return std::string();
-    if (type != fs::symlink_file)
-        return "is no regular file";
-    boost::system::error_code error;
-    const fs::path target = fs::canonical(path, error);
-    if (error)
-        return "is a symbolic link that leads nowhere";
-    if (!liesBelow(target, realFolder))
-        return "is a symbolic link out of the folder";
-    if (fs::is_directory(target))
-        return "is a symbolic link to a folder; declare it in a .symlinks file instead";
-    return fs::is_regular_file(target) ? "" : "is a symbolic link to no regular file";
 }
 
 }  // namespace
@@ -129,43 +96,23 @@ void ArchiveWriter::add(const std::string& name, std::istream& in) {
 void ArchiveWriter::addFile(const std::string& name, const std::string& path) {
     checkUsable();
     checkName(name);
-    const std::unique_ptr<std::FILE, int (*)(std::FILE*)> in(std::fopen(path.c_str(), "rb"),
-                                                             &std::fclose);
-    if (!in)
-        throw FileError(path, errno);
-    addFrom(name, [&](char* into, std::size_t room) {
-        const std::size_t count = std::fread(into, 1, room, in.get());
-        if (std::ferror(in.get()))
-            throw FileError(path, errno);
-        return count;
-    });
+    SourceFile source(path);
+    addFrom(name, [&source](char* into, std::size_t room) { return source.read(into, room); });
 }
 
 void ArchiveWriter::addFolder(const std::string& folder) {
     checkUsable();
-    const std::string root = withoutTrailingSlashes(folder);
-    boost::system::error_code error;
-    const fs::path realRoot = fs::canonical(root, error);
-    if (error)
-        throw FileError(folder, error.message());
-    std::map<std::string, std::string> pathOfName;
-    try {
-        if (liesBelow(fs::canonical(fs::absolute(file.path()).parent_path()), realRoot))
-            throw FileError(file.path(), "The archive would lie in the folder that it packs");
-        for (const fs::directory_entry& entry : fs::recursive_directory_iterator(root)) {
-            const std::string path = entry.path().generic_string();
-            const std::string name = path.substr(root == "/" ? 1 : root.size() + 1);
-            if (!fs::is_directory(fs::symlink_status(entry.path()))) {
-                checkFile(name, obstacle(entry.path(), realRoot));
-                pathOfName[name] = path;
-            }
-        }
-    } catch (const fs::filesystem_error& failure) {
-        throw FileError(failure.path1().empty() ? folder : failure.path1().string(),
-                        failure.code().message());
+    FolderFiles listed(folder);
+    const std::string::size_type slash = file.path().rfind('/');
+    if (listed.contains(slash == std::string::npos ? "." : file.path().substr(0, slash + 1)))
+        throw FileError(file.path(), "The archive would lie in the folder that it packs");
+    for (const auto& member : listed.getFiles())
+        checkFile(member.first, member.second.obstacle);
+    for (const auto& member : listed.getFiles()) {
+        SourceFile source = listed.open(member.first, member.second);
+        addFrom(member.first,
+                [&source](char* into, std::size_t room) { return source.read(into, room); });
     }
-    for (const auto& member : pathOfName)
-        addFile(member.first, member.second);
 }
 
 void ArchiveWriter::checkFile(const std::string& name, const std::string& obstacle) const {

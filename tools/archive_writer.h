@@ -71,7 +71,8 @@ public:
     /// \throws Refused also when the stream fails. What the stream itself throws passes through.
     void add(const std::string& name, std::istream& in);
 
-    /// Adds the bytes of a file. \throws FileError also when the file cannot be read.
+    /// Adds the bytes of a file. \throws FileError also when the file cannot be read, or changes
+    /// its length while it is.
     void addFile(const std::string& name, const std::string& path);
 
     /// Adds every file below a folder, hidden ones too, under its path relative to the folder.
@@ -79,8 +80,10 @@ public:
     /// A symbolic link to a regular file below the folder is stored as a copy of that file. What
     /// cannot be stored ends the call with an exception instead of being left out: a link that
     /// leads out of the folder, to a folder (name that in ".symlinks") or nowhere; a device, pipe
-    /// or socket; and an archive that is itself being written below the folder. Folders without
-    /// files leave no trace, since an archive has only files.
+    /// or socket; and an archive that is itself being written below the folder. What is swapped
+    /// for a link or a pipe after the folder was listed is an error, too: nothing outside the
+    /// folder is ever read. Folders without files leave no trace, since an archive has only files;
+    /// temporary files of an AtomicFile, which may belong to another process, are left out.
     ///
     /// \throws Refused, FileError as addFile() does.
     void addFolder(const std::string& folder);

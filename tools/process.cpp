@@ -30,6 +30,34 @@ extern "C" void endBySignal(int number) {
     ::raise(number);
 }
 
+/// Whether a signal ends a process that has no handler for it. Those that the process brings upon
+/// itself by a fault are left to debuggers and sanitizers.
+bool endsProcess(int number) {
+    switch (number) {
+        case SIGHUP:
+        case SIGINT:
+        case SIGQUIT:
+        case SIGTERM:
+        case SIGABRT:
+        case SIGALRM:
+        case SIGVTALRM:
+        case SIGPROF:
+        case SIGUSR1:
+        case SIGUSR2:
+        case SIGXCPU:
+        case SIGIO:
+#if defined(SIGSTKFLT)
+        case SIGSTKFLT:
+#endif
+#if defined(SIGPWR)
+        case SIGPWR:
+#endif
+            return true;
+        default:
+            return number >= SIGRTMIN;
+    }
+}
+
 /// Sets a handler unless whoever started the process had the signal ignored, as nohup does.
 void setHandler(int number, void (*handler)(int)) {
     struct sigaction action = {};
@@ -50,8 +78,10 @@ void prepareProcess() {
     }
     ::signal(SIGPIPE, SIG_IGN);
     ::signal(SIGXFSZ, SIG_IGN);
-    for (const int number : {SIGHUP, SIGINT, SIGTERM})
-        setHandler(number, &endBySignal);
+    for (int number = 1; number <= SIGRTMAX; ++number) {
+        if (endsProcess(number))
+            setHandler(number, &endBySignal);
+    }
 }
 
 #endif

@@ -5,8 +5,8 @@ namespace pells_tool {
 /// Makes the process fit to report its failures and to leave nothing behind.
 ///
 /// A closed pipe and a file-size limit become write errors instead of signals that end the process;
-/// an interruption removes the unfinished output file; a standard stream that is closed is opened
-/// on the null device, so that no file that the tool opens takes its place.
+/// a signal that ends the process removes the unfinished output file; a standard stream that is
+/// closed is opened on the null device, so that no file that the tool opens takes its place.
 void prepareProcess();
 
 }  // namespace pells_tool
