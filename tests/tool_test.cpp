@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 #include <png.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 
 #include <algorithm>
@@ -103,7 +104,19 @@ TEST_F(ToolTest, FailsWithOneLineAndLeavesNothing) {
         {"pack -o in/out.pell in",
          "pack: in/out.pell: The archive would lie in the folder that it packs"},
         {"cat good.pell nope", "cat: good.pell: The archive has no member 'nope'"},
-        {"cat cut.pell a", "cat: cut.pell: member 'a': Can't read pell data stream for member 'a'"},
+        {"list --frob", "list: unknown option '--frob' (see --help)"},
+        {"list missing.pell", "list: missing.pell: No such file or directory"},
+        {"list in", "list: in: Is a directory"},
+        {"list pipe", "list: pipe: Not a regular file"},
+        {"list ended.pell",
+         "list: ended.pell: The directory should begin at byte 39, but the file has only 39"},
+        {"cat ended.pell a",
+         "cat: ended.pell: The directory should begin at byte 39, but the file has only 39"},
+        {"cat cut.pell a", "cat: cut.pell: member 'a': The file ends inside the data"},
+        {"cat good.pell '[m]'", "cat: good.pell: The archive has no member '[m]'"},
+        {"cat junk.pell a",
+         "cat: junk.pell: member 'a': The data is damaged: incorrect header check"},
+        {"resolve root", "resolve: NAME is required (see --help)"},
         {"resolve good.pell a", "resolve: good.pell: Not a directory"},
         {"sheet root -o /dev/null", "sheet: /dev/null: Not a regular file"},
         {"sheet in -o good.pell",
@@ -136,6 +149,10 @@ TEST_F(ToolTest, FailsWithOneLineAndLeavesNothing) {
     scratch.write("root/Data/images.xml", definitions(definition("a", "a.tga")));
     scratch.write("good.pell", archiveOf({{"a", "hello\n"}, {"big", std::string(3000000, 'x')}}));
     scratch.write("cut.pell", archiveWithDirectory("O99 L9 |a\r\n"));
+    scratch.write("ended.pell", archiveOf({{"a", "some bytes"}}).substr(0, 39));
+    ASSERT_EQ(readFile("ended.pell").substr(6, 8), "00000027");
+    scratch.write("junk.pell", archiveWithDirectory("O15 L4 |a\r\n", "JUNK"));
+    ASSERT_EQ(mkfifo("pipe", 0600), 0);
     scratch.write("cut.xml", "<material><shininess>5</shininess>");
     scratch.write("wood.xml", "<m><texname>wood.tga</texname></m>");
     scratch.write("none.xml", "<m><texname>none.tga</texname></m>");
@@ -143,8 +160,111 @@ TEST_F(ToolTest, FailsWithOneLineAndLeavesNothing) {
     for (const auto& each : cases)
         expectFailure(each.first, each.second);
     const Outcome pipe = shell("set -o pipefail; \"$PELLS\" cat good.pell big | head -c1");
-    EXPECT_EQ(pipe.status, 1);
-    EXPECT_EQ(pipe.err, "pells: cat: standard output: Broken pipe\n");
+    EXPECT_EQ(pipe.status, 128 + 13) << "as any tool ends whose reader goes away";
+    EXPECT_EQ(pipe.err, "");
+}
+
+TEST_F(ToolTest, TellsAMemberThatIsNotWhole) {
+    const std::string stored = deflated(std::string(100000, 'x'));
+    const std::string size = hexadecimal(stored.size());
+    const std::pair<std::string, std::string> cases[] = {
+        {"O15 L" + hexadecimal(stored.size() - 3), "The stored bytes end before the data does"},
+        {"O15 L" + hexadecimal(stored.size() + 1), "More bytes are stored than the data has"},
+        {"O15 Lffff", "More bytes are stored than the data has"}};
+    for (const auto& each : cases) {
+        scratch.write("a.pell", archiveWithDirectory(each.first + " |m\r\n", stored + "rest"));
+        const Outcome outcome = pells("cat a.pell m");
+        EXPECT_EQ(outcome.out, std::string(100000, 'x'));
+        EXPECT_EQ(outcome.err, "pells: cat: a.pell: member 'm': " + each.second + "\n");
+        EXPECT_EQ(outcome.status, 1);
+    }
+    const Outcome list = pells("list a.pell");
+    EXPECT_EQ(list.out, "     65535  m\n");
+    EXPECT_EQ(list.err, "pells: list: a.pell: 1 member of 1 reach beyond the end of the file\n");
+}
+
+TEST_F(ToolTest, TakesNamesAsTheyAreAndShowsThemHarmlessly) {
+    for (const char* const name : {"root/a", "root/[b]", "root/[a,c]"})
+        scratch.write(name, "x");
+    const Outcome resolved = pells("resolve root '[a]' '[b]' '[a,c]' '' '%' a");
+    EXPECT_EQ(resolved.out,
+              "[a]: nowhere\n[b]: plain file root/[b], in no archive\n"
+              "[a,c]: plain file root/[a,c], in no archive\n: nowhere\n%: nowhere\n"
+              "a: plain file root/a, in no archive\n");
+    const std::string names[] = {"\xC2\x9B", "\x9B",     "\xE2\x80\xAE", "\xEF\xBB\xBF",
+                                 "\x7F",     "\xD0\x96", "\xE6\x97\xA5", "\xF0\x9F\x98\x80",
+                                 "\xE9"};
+    std::string directory;
+    for (const std::string& name : names)
+        directory += "O0 L0 |" + name + "\r\n";
+    scratch.write("a.pell", archiveWithDirectory(directory));
+    std::string shown = pells("list a.pell").out;
+    for (std::size_t at; (at = shown.find("         0  ")) != std::string::npos;)
+        shown.erase(at, 12);
+    EXPECT_EQ(shown,
+              "\\x7f\n\\x9b\n\\xc2\\x9b\n\xD0\x96\n\\xe2\\x80\\xae\n\xE6\x97\xA5\n\xE9\n"
+              "\\xef\\xbb\\xbf\n\xF0\x9F\x98\x80\n");
+}
+
+TEST_F(ToolTest, LeavesTheLogAndTheInputOfOthersAlone) {
+    scratch.write("pells.log", "of the application\n");
+    scratch.write("good.pell", "");
+    scratch.write("root/Data/images.xml", definitions(definition("a", "a.tga")));
+    scratch.write("root/a.tga", tgaFile(2, 2, 24));
+    scratch.write("in.xml", "<m><texname>a.tga</texname></m>");
+    ASSERT_EQ(symlink("root/a.tga", "link.png"), 0);
+    const std::pair<const char*, const char*> cases[] = {
+        {"swatch in.xml --root root -o in.xml", "swatch: in.xml"},
+        {"swatch in.xml --root root -o link.png", "swatch: link.png"},
+        {"sheet root -o root/Data/images.xml", "sheet: root/Data/images.xml"},
+        {"sheet root -o link.png", "sheet: link.png"}};
+    for (const auto& each : cases)
+        expectFailure(each.first, each.second + std::string(": It would replace what is read"));
+    EXPECT_EQ(readFile("root/a.tga"), tgaFile(2, 2, 24));
+    EXPECT_EQ(pells("resolve root none").status, 1);
+    EXPECT_EQ(pells("sheet root -o sheet.png").err, "");
+    EXPECT_EQ(readFile("pells.log"), "of the application\n");
+    EXPECT_NE(pells("sheet root -o sheet.png --log time.summary").err.find("time.summary: "),
+              std::string::npos);
+    EXPECT_EQ(pells("sheet root -o sheet.png --log time.summary --log-file own.log").err, "");
+    EXPECT_NE(readFile("own.log").find("time.summary: "), std::string::npos);
+}
+
+TEST_F(ToolTest, ReadsDocumentsAndPicturesUpToALimit) {
+    scratch.write("large.xml", "<m>" + std::string(200000, ' ') + "</m>");
+    scratch.write("root/Data/images.xml", definitions(definition("a", "a.tga")));
+    scratch.write("root/a.tga", tgaFile(40, 40, 24));
+    EXPECT_EQ(pells("swatch large.xml -o out.png --max-document 100K").err,
+              "pells: swatch: large.xml: XML document goes on beyond byte 102403 (--max-document "
+              "sets the limit)\n");
+    EXPECT_EQ(pells("swatch large.xml -o out.png --max-document 1M").err, "");
+    EXPECT_NE(pells("sheet root -o out.png --max-pixels 1599")
+                  .out.find("a.tga: tga image too large (--max-pixels sets the limit)\n"),
+              std::string::npos);
+    EXPECT_EQ(pells("sheet root -o out.png --max-pixels 1600").out,
+              "1 of 1 picture found, 0 of them by a fallback\n");
+}
+
+TEST_F(ToolTest, SpreadsManyPicturesOverPages) {
+    std::string entries;
+    for (int i = 1000; i < 1700; ++i)
+        entries += definition(std::to_string(i), "a.tga");
+    scratch.write("root/Data/images.xml", definitions(entries));
+    scratch.write("root/a.tga", tgaFile(2, 2, 24));
+    EXPECT_EQ(pells("sheet root -o sheet.png").out,
+              "sheet-1.png: Pictures 1 to 530 of 700\n"
+              "sheet-2.png: 700 of 700 pictures found, 0 of them by a fallback\n");
+    EXPECT_EQ(files(), (Lines{"root", "sheet-1.png", "sheet-2.png"}));
+    EXPECT_FALSE(decodePng("sheet-2.png").empty());
+}
+
+TEST_F(ToolTest, WritesAnArchiveToStandardOutput) {
+    scratch.write("in/file", "x");
+    EXPECT_EQ(pells("pack -o a.pell in && \"$PELLS\" pack -o - in | cmp - a.pell").status, 0);
+    EXPECT_EQ(pells("pack -o ./- in").status, 0);
+    EXPECT_EQ(files(), (Lines{"-", "a.pell", "in"}));
+    EXPECT_EQ(pells("pack -o - in >/dev/full").err,
+              "pells: pack: standard output: No space left on device\n");
 }
 
 TEST_F(ToolTest, KeepsTheOldOutputWhenItIsInterrupted) {

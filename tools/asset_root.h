@@ -6,12 +6,16 @@ namespace pells_tool {
 
 class ErrorLines;
 
-/// Makes the library's asset manager for a folder, and prints a warning for everything in it that
-/// cannot be read.
+/// Makes the library's asset manager for a folder, after setUpLibrary(), and prints a warning for
+/// everything in it that cannot be read.
 ///
-/// \param logRules rules for log tags, besides that errors are logged.
 /// \throws pells::FileError when the folder cannot be used.
-void openAssetRoot(const std::string& root, const std::string& logRules, ErrorLines& errors);
+void openAssetRoot(const std::string& root, ErrorLines& errors);
+
+/// A message of the library in words for people.
+///
+/// \param path of the archive that it speaks of, if it does of one.
+std::string inWords(const std::string& message, const std::string& path = std::string());
 
 /// Prints a line "pells: warning: ..." on standard error.
 void warn(const std::string& what);

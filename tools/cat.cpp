@@ -3,8 +3,10 @@
 #include <string>
 #include <vector>
 
+#include "pells/asset/asset_manager.h"
 #include "tools/atomic_file.h"
 #include "tools/commands.h"
+#include "tools/member_reader.h"
 #include "tools/open_archive.h"
 #include "tools/standard_output.h"
 
@@ -17,25 +19,30 @@ struct CatOptions {
     std::string member;
 };
 
-/// Reads the next bytes of the selected member; 0 at its end.
-std::size_t readSome(pells::pellistream& archive, std::vector<char>& into,
-                     const CatOptions& options) {
-    try {
-        archive.read(into.data(), static_cast<std::streamsize>(into.size()));
-        return static_cast<std::size_t>(archive.gcount());
-    } catch (const std::exception& error) {
-        throw pells::FileError(options.file + ": member '" + options.member + "'",
-                               std::string(error.what()));
-    }
+/// The entry of a member; like the library, takes "\\" for "/" where no name has it.
+const pells::pellistream::Directory::value_type& findMember(const pells::pellistream& archive,
+                                                            const CatOptions& options) {
+    const auto& directory = archive.getDirectory();
+    auto entry = directory.find(options.member);
+    if (entry == directory.end())
+        entry = directory.find(pells::AssetManager::fixName(options.member));
+    if (entry == directory.end())
+        throw pells::FileError(options.file, "The archive has no member '" + options.member + "'");
+    return *entry;
 }
 
 void cat(const CatOptions& options) {
     const auto archive = openArchive(options.file);
-    if (!archive->open(options.member))
-        throw pells::FileError(options.file, "The archive has no member '" + options.member + "'");
+    MemberReader member(options.file, findMember(*archive, options));
     std::vector<char> block(65536);
-    while (const std::size_t count = readSome(*archive, block, options))
-        writeOut(block.data(), count);
+    // What comes before a damage is of use to whoever looks for it.
+    try {
+        while (const std::size_t count = member.read(block.data(), block.size()))
+            writeOut(block.data(), count);
+    } catch (const pells::FileError&) {
+        flushOut();
+        throw;
+    }
 }
 
 }  // namespace

@@ -1,6 +1,7 @@
 #include "tools/contact_sheet.h"
 
 #include <cmath>
+#include <limits>
 #include <utility>
 
 namespace pells_tool {
@@ -123,6 +124,10 @@ void drawLegend(Canvas& canvas, double right, double baseline) {
 }
 
 }  // namespace
+
+std::size_t ContactSheet::mostCells() {
+    return sheetCapacity(layoutFor(std::numeric_limits<int>::max()));
+}
 
 ContactSheet::ContactSheet(const std::string& path, const std::string& title, std::size_t cells)
     : layout(layoutFor(cells)), rows(path, layout, cells, "Too many pictures for one sheet") {

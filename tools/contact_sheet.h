@@ -40,6 +40,10 @@ public:
     /// Ends the sheet with a line of text and gives the file its name.
     void finish(const std::string& summary);
 
+    /// How many cells a sheet should have at the most: one that is higher than 16,384 pixels is
+    /// more than many programs show.
+    static std::size_t mostCells();
+
     /// The size of the place for a picture.
     static constexpr int boxWidth = 200;
     static constexpr int boxHeight = 156;

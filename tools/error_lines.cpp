@@ -28,6 +28,8 @@ std::vector<std::string> ErrorLines::take() {
 
 void ErrorLines::write(const char* text) {
     gathered += text;
+    if (previous)
+        previous->write(text);
 }
 
 }  // namespace pells_tool

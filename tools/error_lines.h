@@ -9,7 +9,8 @@ namespace pells_tool {
 
 /// Gathers what the library logs under "error" while it lives: the reasons of its failures.
 ///
-/// There are none when the rules for log tags switch "error" off.
+/// There are none when the rules for log tags switch "error" off. The sink that was set before gets
+/// all lines, too.
 class ErrorLines : public pells::platform::DebuggerSink {
 public:
     ErrorLines();

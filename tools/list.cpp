@@ -1,9 +1,11 @@
 #include <CLI/CLI.hpp>
+#include <cstdint>
 #include <iomanip>
 #include <memory>
 #include <sstream>
 #include <string>
 
+#include "tools/atomic_file.h"
 #include "tools/commands.h"
 #include "tools/open_archive.h"
 #include "tools/standard_output.h"
@@ -15,11 +17,20 @@ namespace {
 
 void list(const std::string& file) {
     const auto archive = openArchive(file);
+    const std::uint64_t size = sizeOfFile(file);
+    std::size_t outside = 0;
     for (const auto& member : archive->getDirectory()) {
         std::ostringstream line;
         line << std::setw(10) << member.second.length << "  " << printable(member.first) << '\n';
         writeOut(line.str());
+        const std::uint64_t offset = static_cast<std::uint64_t>(member.second.offset);
+        outside += offset + member.second.length > size ? 1 : 0;
     }
+    flushOut();
+    if (outside != 0)
+        throw pells::FileError(file, counted(outside, "member") + " of " +
+                                         std::to_string(archive->getDirectory().size()) +
+                                         " reach beyond the end of the file");
 }
 
 }  // namespace

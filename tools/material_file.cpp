@@ -7,6 +7,7 @@
 #include "pells/material/material.h"
 #include "pells/xml/tag.h"
 #include "pells/xml/tokenizer.h"
+#include "tools/asset_root.h"
 #include "tools/atomic_file.h"
 
 namespace pells_tool {
@@ -54,7 +55,7 @@ pells::Material readMaterial(const std::string& path) {
     try {
         load(material, file);
     } catch (const std::exception& error) {
-        throw pells::FileError(path, std::string(error.what()));
+        throw pells::FileError(path, inWords(error.what()));
     }
     return material;
 }

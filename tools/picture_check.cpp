@@ -1,6 +1,8 @@
 #include "tools/picture_check.h"
 
+#include <boost/filesystem/operations.hpp>
 #include <istream>
+#include <map>
 #include <typeinfo>
 
 #include "pells/asset/asset_manager.h"
@@ -8,8 +10,10 @@
 #include "pells/core/class_name.h"
 #include "pells/image/image_fallback_manager.h"
 #include "pells/image/image_loaders.h"
+#include "tools/asset_root.h"
 #include "tools/atomic_file.h"
 #include "tools/error_lines.h"
+#include "tools/pages.h"
 
 namespace pells_tool {
 
@@ -25,8 +29,13 @@ int imageType(std::istream& in) {
 
 int imageType(const pells::TGAFileLoader& loader) {
     if (dynamic_cast<const pells::PellTGAFileLoader*>(&loader)) {
+        // Many pictures may come from one archive, whose directory may be large.
+        static std::map<std::string, int> known;
+        const auto place = known.find(loader.getFileName());
+        if (place != known.end())
+            return place->second;
         pells::pellistream archive(loader.getFileName());
-        return archive.open("tga") ? imageType(archive) : -1;
+        return known[loader.getFileName()] = archive.open("tga") ? imageType(archive) : -1;
     }
     const auto asset = pells::AssetManager::instance().getFileStream(loader.getFileName(), true);
     return asset ? imageType(asset->getStream()) : -1;
@@ -106,11 +115,12 @@ std::vector<std::string> definedPictures(ErrorLines& errors) {
     try {
         names = pells::ImageFallbackManager::instance().getImageNames();
     } catch (const std::exception& error) {
-        throw pells::FileError(asset, std::string(error.what()));
+        throw pells::FileError(asset, inWords(error.what()));
     }
     const std::vector<std::string> reasons = errors.take();
     if (names.empty())
-        throw pells::FileError(asset, reasons.empty() ? "It defines no picture" : reasons.front());
+        throw pells::FileError(
+            asset, reasons.empty() ? "It defines no picture" : inWords(reasons.front()));
     return names;
 }
 
@@ -118,6 +128,21 @@ std::string complaint(const pells::ImageLoaderBase& loader) {
     const auto* const tga = dynamic_cast<const pells::TGAFileLoader*>(&loader);
     const int type = tga ? imageType(*tga) : -1;
     return type < 0 ? "" : complaint(type);
+}
+
+void protectPictures(const std::string& output, const std::vector<std::string>& names) {
+    if (!boost::filesystem::exists(output))
+        return;
+    const pells::AssetManager& assets = pells::AssetManager::instance();
+    protectInput(output, assets.resolve(definitionsName).path);
+    for (const std::string& name : names) {
+        for (const pells::ImageLoaderBase* const loader :
+             pells::ImageFallbackManager::instance().getLoaders(name)) {
+            const std::string file = fileOf(*loader);
+            const bool isArchive = dynamic_cast<const pells::PellTGAFileLoader*>(loader) != nullptr;
+            protectInput(output, isArchive ? file : assets.resolve(file).path);
+        }
+    }
 }
 
 PictureCheck checkPicture(const std::string& name, ErrorLines& errors) {

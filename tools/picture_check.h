@@ -42,6 +42,10 @@ std::vector<std::string> definedPictures(ErrorLines& errors);
 /// Why the pixels of a file that was read may not be what it means; empty where they are.
 std::string complaint(const pells::ImageLoaderBase& loader);
 
+/// Checks that an output file is none of those that the pictures, or their definitions, are read
+/// from. \throws pells::FileError
+void protectPictures(const std::string& output, const std::vector<std::string>& names);
+
 /// Asks the loaders of a picture one after the other.
 PictureCheck checkPicture(const std::string& name, ErrorLines& errors);
 

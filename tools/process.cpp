@@ -20,6 +20,8 @@ void prepareProcess() {
     _setmode(_fileno(stdout), _O_BINARY);
 }
 
+void endByClosedPipe() {}
+
 #else
 
 namespace {
@@ -82,6 +84,11 @@ void prepareProcess() {
         if (endsProcess(number))
             setHandler(number, &endBySignal);
     }
+}
+
+void endByClosedPipe() {
+    ::signal(SIGPIPE, SIG_DFL);
+    ::raise(SIGPIPE);
 }
 
 #endif

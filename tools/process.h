@@ -9,4 +9,7 @@ namespace pells_tool {
 /// closed is opened on the null device, so that no file that the tool opens takes its place.
 void prepareProcess();
 
+/// Ends the process as a closed pipe ends one that does not ask for errors.
+void endByClosedPipe();
+
 }  // namespace pells_tool

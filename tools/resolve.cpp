@@ -8,6 +8,7 @@
 #include "tools/atomic_file.h"
 #include "tools/commands.h"
 #include "tools/error_lines.h"
+#include "tools/library_prefs.h"
 #include "tools/standard_output.h"
 #include "tools/text.h"
 
@@ -19,7 +20,7 @@ typedef pells::AssetManager::Resolution Resolution;
 
 struct ResolveOptions {
     std::string root;
-    std::string logRules;
+    LibraryOptions library;
     std::vector<std::string> names;
 };
 
@@ -63,8 +64,9 @@ std::string lineFor(const std::string& name, const Resolution& found) {
 }
 
 void resolve(const ResolveOptions& options) {
+    setUpLibrary(options.root, options.library);
     ErrorLines errors;
-    openAssetRoot(options.root, options.logRules, errors);
+    openAssetRoot(options.root, errors);
     std::size_t missing = 0;
     for (const std::string& name : options.names) {
         const Resolution found = pells::AssetManager::instance().resolve(name);
@@ -86,8 +88,7 @@ void addResolve(CLI::App& app) {
         app.add_subcommand("resolve", "Say where the assets of a folder come from");
     command->add_option("ROOT", options->root, "The asset root")->required()->type_name("");
     command->add_option("NAME", options->names, "Names of assets")->required()->type_name("");
-    command->add_option("--log", options->logRules, "Rules for log tags, beside errors")
-        ->type_name("RULES");
+    addLogOptions(*command, options->library);
     command->footer(
         "Where archives that hold a name have equal write times, the one serves that the file\n"
         "system lists first: copying them may change the answer.");

@@ -7,6 +7,8 @@
 #include "tools/commands.h"
 #include "tools/contact_sheet.h"
 #include "tools/error_lines.h"
+#include "tools/library_prefs.h"
+#include "tools/pages.h"
 #include "tools/picture_check.h"
 #include "tools/standard_output.h"
 #include "tools/text.h"
@@ -18,7 +20,7 @@ namespace {
 struct SheetOptions {
     std::string root;
     std::string output;
-    std::string logRules;
+    LibraryOptions library;
 };
 
 std::string formatName(const pells::Image_base& image) {
@@ -47,7 +49,8 @@ std::string reason(const Attempt& attempt) {
     std::string text;
     for (const std::string& line : attempt.reasons) {
         const bool repeats = line.compare(0, prefix.size(), prefix) == 0;
-        text += (text.empty() ? "" : "; ") + line.substr(repeats ? prefix.size() : 0);
+        text += (text.empty() ? "" : "; ") +
+                inWords(line.substr(repeats ? prefix.size() : 0), attempt.file);
     }
     return text;
 }
@@ -121,20 +124,36 @@ SheetCell makeCell(const PictureCheck& check) {
     return cell;
 }
 
-void sheet(const SheetOptions& options) {
-    ErrorLines errors;
-    openAssetRoot(options.root, options.logRules, errors);
-    const std::vector<std::string> names = definedPictures(errors);
-    ContactSheet contactSheet(options.output, options.root, names.size());
-    Report report;
-    for (const std::string& name : names) {
-        const PictureCheck check = checkPicture(name, errors);
+/// Draws the pictures of one page. The report goes on from page to page.
+void drawPage(const SheetOptions& options, const Page& page, const std::vector<std::string>& names,
+              Report& report, ErrorLines& errors) {
+    ContactSheet contactSheet(page.path(options.output), options.root + page.title(),
+                              page.end - page.begin);
+    for (std::size_t i = page.begin; i < page.end; ++i) {
+        const PictureCheck check = checkPicture(names[i], errors);
         report.add(check);
         contactSheet.add(makeCell(check));
     }
-    writeOut(report.summary() + "\n");
+    std::string summary = report.summary();
+    if (page.number < page.count)
+        summary = "Pictures " + std::to_string(page.begin + 1) + " to " + std::to_string(page.end) +
+                  " of " + std::to_string(names.size());
+    writeOut((page.count > 1 ? printable(page.path(options.output)) + ": " : "") + summary + "\n");
     flushOut();
-    contactSheet.finish(report.summary());
+    contactSheet.finish(summary);
+}
+
+void sheet(const SheetOptions& options) {
+    setUpLibrary(options.root, options.library);
+    ErrorLines errors;
+    openAssetRoot(options.root, errors);
+    const std::vector<std::string> names = definedPictures(errors);
+    const std::vector<Page> pages = paginate(names.size(), ContactSheet::mostCells());
+    for (const Page& page : pages)
+        protectPictures(page.path(options.output), names);
+    Report report;
+    for (const Page& page : pages)
+        drawPage(options, page, names, report, errors);
 }
 
 }  // namespace
@@ -144,17 +163,20 @@ void addSheet(CLI::App& app) {
     CLI::App* const command =
         app.add_subcommand("sheet", "Draw every picture that Data/images.xml defines on one sheet");
     command->add_option("ROOT", options->root, "The asset root")->required()->type_name("");
-    command->add_option("-o,--output", options->output, "The PNG file to make or replace")
+    command
+        ->add_option(
+            "-o,--output", options->output,
+            "The PNG file to make or replace; OUT-1.png and so on where there are several pages")
         ->required()
         ->type_name("FILE");
-    command->add_option("--log", options->logRules, "Rules for log tags, beside errors")
-        ->type_name("RULES");
+    addLogOptions(*command, options->library);
+    addLimitOptions(*command, options->library);
     command->footer(
         "Each picture has its name, size, format and the loader that served it, or the reasons "
         "why\n"
         "none did; standard output tells which pictures fell back or were not found. A\n"
         "PellTGAFileLoader's archive is looked for from the current directory.\n"
-        "--log time.summary makes the log end with a table of where the time went.");
+        "--log time.summary ends with a table of where the time went.");
     command->callback([options] { sheet(*options); });
 }
 

@@ -35,6 +35,12 @@ int sheetColumns(std::size_t cells, double wider, int least, int most) {
     return static_cast<int>(std::min<double>(most, std::max<double>(least, wanted)));
 }
 
+std::size_t sheetCapacity(const SheetLayout& layout) {
+    const int mostHigh = 16384;
+    const int rows = (mostHigh - layout.header - layout.footer) / (layout.cellHeight + layout.gap);
+    return static_cast<std::size_t>(rows) * static_cast<std::size_t>(layout.columns);
+}
+
 SheetRows::SheetRows(const std::string& path, const SheetLayout& distances, std::size_t cells,
                      const char* tooMany)
     : layout(distances),

@@ -22,6 +22,9 @@ struct SheetLayout {
 /// As many columns as make a sheet of cells about so many times wider than high, within bounds.
 int sheetColumns(std::size_t cells, double wider, int least, int most);
 
+/// How many cells of a layout a picture of at most 16,384 pixels height has.
+std::size_t sheetCapacity(const SheetLayout& layout);
+
 /// A PNG picture of cells in rows and columns, written row after row: memory does not depend on the
 /// number of cells.
 class SheetRows {

@@ -10,8 +10,11 @@ namespace pells_tool {
 namespace {
 
 void check(bool succeeded) {
-    if (!succeeded)
-        throw pells::FileError("standard output", errno);
+    if (succeeded)
+        return;
+    if (errno == EPIPE)
+        throw ReaderGone();
+    throw pells::FileError("standard output", errno);
 }
 
 }  // namespace

@@ -1,12 +1,16 @@
 #pragma once
 
 #include <cstddef>
+#include <exception>
 #include <string>
 
 namespace pells_tool {
 
-/// Writes to standard output. Whoever reads it may be gone, or its disk full: each function throws
-/// pells::FileError when the bytes cannot be written.
+/// Whoever reads standard output has gone away: the end of the work, and nothing to complain of.
+class ReaderGone : public std::exception {};
+
+/// Writes to standard output. Its disk may be full, or its reader gone: each function throws
+/// pells::FileError when the bytes cannot be written, or ReaderGone.
 void writeOut(const std::string& text);
 void writeOut(const char* bytes, std::size_t count);
 

@@ -4,6 +4,7 @@
 #include <string>
 #include <vector>
 
+#include "pells/asset/asset_manager.h"
 #include "pells/image/image_base.h"
 #include "pells/image/image_loaders.h"
 #include "pells/material/material.h"
@@ -13,6 +14,7 @@
 #include "tools/error_lines.h"
 #include "tools/library_prefs.h"
 #include "tools/material_file.h"
+#include "tools/pages.h"
 #include "tools/picture_check.h"
 #include "tools/sphere.h"
 #include "tools/swatch_sheet.h"
@@ -28,7 +30,7 @@ struct SwatchOptions {
     std::vector<std::string> blended;
     std::string output;
     std::string root;
-    std::string logRules;
+    LibraryOptions library;
 };
 
 /// A material, and where its texture's name was read.
@@ -72,8 +74,8 @@ std::vector<Swatch> readSwatches(const SwatchOptions& options) {
 std::string reasonOf(ErrorLines& errors, const std::string& thrown) {
     const std::vector<std::string> reasons = errors.take();
     if (!reasons.empty())
-        return reasons.front();
-    return thrown.empty() ? "failed without a reason in the log" : thrown;
+        return inWords(reasons.front());
+    return thrown.empty() ? "failed without a reason in the log" : inWords(thrown);
 }
 
 Picture readPicture(const std::string& name, const std::string& where, ErrorLines& errors) {
@@ -108,27 +110,47 @@ Picture textureOf(const Swatch& swatch, const SwatchOptions& options, ErrorLines
 }
 
 void openLibrary(const SwatchOptions& options, ErrorLines& errors) {
-    if (options.root.empty())
-        setLibraryPrefs("", options.logRules);
-    else
-        openAssetRoot(options.root, options.logRules, errors);
+    if (!options.root.empty())
+        openAssetRoot(options.root, errors);
+}
+
+/// Checks that an output file is no material or texture.
+void protectInputs(const std::string& output, const SwatchOptions& options,
+                   const std::vector<Swatch>& swatches) {
+    for (const Swatch& each : swatches) {
+        protectInput(output, each.file);
+        const std::string& texture = each.card.material.textureName();
+        if (!options.root.empty() && !texture.empty())
+            protectInput(output, pells::AssetManager::instance().resolve(texture).path);
+    }
+}
+
+void drawPage(const SwatchOptions& options, const Page& page, std::vector<Swatch>& swatches,
+              ErrorLines& errors) {
+    SwatchSheet sheet(page.path(options.output), page.end - page.begin);
+    for (std::size_t i = page.begin; i < page.end; ++i) {
+        SwatchCard& card = swatches[i].card;
+        const Picture texture = textureOf(swatches[i], options, errors);
+        card.sphere = renderSphere(card.material, texture.get(), SwatchSheet::sphereSize);
+        sheet.add(card);
+        card.sphere = {};
+    }
+    sheet.finish();
 }
 
 void swatch(const SwatchOptions& options) {
     if (options.files.empty() && options.blended.empty())
         throw CLI::RequiredError("MATERIAL.xml or --blend");
+    setUpLibrary(options.root, options.library);
     ErrorLines errors;
     openLibrary(options, errors);
     std::vector<Swatch> swatches = readSwatches(options);
     errors.take();
-    SwatchSheet sheet(options.output, swatches.size());
-    for (Swatch& each : swatches) {
-        const Picture texture = textureOf(each, options, errors);
-        each.card.sphere = renderSphere(each.card.material, texture.get(), SwatchSheet::sphereSize);
-        sheet.add(each.card);
-        each.card.sphere = {};
-    }
-    sheet.finish();
+    const std::vector<Page> pages = paginate(swatches.size(), SwatchSheet::mostCards());
+    for (const Page& page : pages)
+        protectInputs(page.path(options.output), options, swatches);
+    for (const Page& page : pages)
+        drawPage(options, page, swatches, errors);
 }
 
 }  // namespace
@@ -139,7 +161,10 @@ void addSwatch(CLI::App& app) {
         app.add_subcommand("swatch", "Draw materials as lit spheres, with their values");
     command->add_option("MATERIAL.xml", options->files, "Files of one material each")
         ->type_name("");
-    command->add_option("-o,--output", options->output, "The PNG file to make or replace")
+    command
+        ->add_option(
+            "-o,--output", options->output,
+            "The PNG file to make or replace; OUT-1.png and so on where there are several pages")
         ->required()
         ->type_name("FILE");
     command->add_option("--blend", options->blended, "Two materials, and the blend of both")
@@ -149,8 +174,8 @@ void addSwatch(CLI::App& app) {
         ->type_name("A.xml B.xml");
     command->add_option("--root", options->root, "The asset root that holds the textures")
         ->type_name("ROOT");
-    command->add_option("--log", options->logRules, "Rules for log tags, beside errors")
-        ->type_name("RULES");
+    addLogOptions(*command, options->library);
+    addLimitOptions(*command, options->library);
     command->footer("The blend keeps the texture of the first of the two.");
     command->callback([options] { swatch(*options); });
 }

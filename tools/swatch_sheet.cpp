@@ -4,6 +4,7 @@
 #include <cmath>
 #include <cstdint>
 #include <cstdio>
+#include <limits>
 #include <vector>
 
 namespace pells_tool {
@@ -170,6 +171,10 @@ void drawCard(Canvas& canvas, double left, const SwatchCard& card) {
 }
 
 }  // namespace
+
+std::size_t SwatchSheet::mostCards() {
+    return sheetCapacity(layoutFor(std::numeric_limits<int>::max()));
+}
 
 SwatchSheet::SwatchSheet(const std::string& path, std::size_t cards)
     : rows(path, layoutFor(cards), cards, "Too many materials for one picture") {

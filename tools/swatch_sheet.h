@@ -32,6 +32,9 @@ public:
     /// Gives the file its name.
     void finish();
 
+    /// How many cards a sheet should have at the most, see ContactSheet::mostCells().
+    static std::size_t mostCards();
+
     static constexpr int sphereSize = 196;
 
 private:

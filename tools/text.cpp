@@ -1,5 +1,6 @@
 #include "tools/text.h"
 
+#include <algorithm>
 #include <cstddef>
 
 namespace pells_tool {
@@ -33,17 +34,50 @@ std::size_t sequenceLength(const std::string& text, std::size_t at) {
     return length;
 }
 
+/// The character of a valid sequence.
+unsigned codePoint(const std::string& sequence) {
+    const unsigned lead = byteAt(sequence, 0);
+    if (sequence.size() == 1)
+        return lead;
+    unsigned code = lead & (0xFFU >> (sequence.size() + 1));
+    for (std::size_t i = 1; i < sequence.size(); ++i)
+        code = code << 6 | (byteAt(sequence, i) & 0x3F);
+    return code;
+}
+
+/// Control characters, C1 among them, breaks of lines and paragraphs, and what turns the direction
+/// of the text around it.
+bool misleadsTerminal(unsigned code) {
+    return code < 0x20 || (code >= 0x7F && code < 0xA0) || code == 0x2028 || code == 0x2029 ||
+           (code >= 0x202A && code <= 0x202E) || (code >= 0x2066 && code <= 0x2069) ||
+           code == 0xFEFF;
+}
+
+/// \param length of the UTF-8 sequence, 0 for a byte that is none: terminals with other encodings
+///               take the lower half of those for control characters.
+bool isHarmless(const std::string& piece, std::size_t length) {
+    return length == 0 ? byteAt(piece, 0) >= 0xA0 : !misleadsTerminal(codePoint(piece));
+}
+
+std::string escaped(const std::string& bytes) {
+    const char digits[] = "0123456789abcdef";
+    std::string result;
+    for (const char c : bytes) {
+        const unsigned byte = static_cast<unsigned char>(c);
+        result += {'\\', 'x', digits[byte / 16], digits[byte % 16]};
+    }
+    return result;
+}
+
 }  // namespace
 
 std::string printable(const std::string& text) {
-    const char digits[] = "0123456789abcdef";
     std::string result;
-    for (const char c : text) {
-        const unsigned byte = static_cast<unsigned char>(c);
-        if (byte >= 0x20 && byte != 0x7F)
-            result += c;
-        else
-            result += {'\\', 'x', digits[byte / 16], digits[byte % 16]};
+    for (std::size_t at = 0; at < text.size();) {
+        const std::size_t length = sequenceLength(text, at);
+        const std::string piece = text.substr(at, std::max<std::size_t>(length, 1));
+        result += isHarmless(piece, length) ? piece : escaped(piece);
+        at += piece.size();
     }
     return result;
 }

@@ -5,7 +5,8 @@
 
 namespace pells_tool {
 
-/// The text with its control characters written as \xNN: one line, harmless to a terminal.
+/// The text with its control characters, and those that turn the direction of writing, as \xNN:
+/// one line, harmless to a terminal. Names in any alphabet stay as they are.
 std::string printable(const std::string& text);
 
 /// The printable text as valid UTF-8: bytes that are none become U+FFFD.

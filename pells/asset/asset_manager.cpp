@@ -8,11 +8,11 @@
 #include <ostream>
 
 #include "pells/asset/asset_path.h"
-#include "pells/asset/regular_file.h"
 #include "pells/core/class_name.h"
 #include "pells/core/prefs.h"
 #include "pells/log/log.h"
 #include "pells/platform/debugger.h"
+#include "pells/platform/regular_file.h"
 
 namespace pells {
 
@@ -38,6 +38,10 @@ const std::string& fixedName(const std::string& name, std::string& converted) {
     if (name.find('\\') == std::string::npos)
         return name;
     return converted = AssetManager::fixName(name);
+}
+
+bool canBeRead(const std::string& path) {
+    return platform::RegularFile().openToRead(path);
 }
 
 /// What exists below the root under an asset's name.
@@ -400,7 +404,7 @@ AssetManager::Resolution AssetManager::resolve(const std::string& name) const {
     }
     if (cached != cache.end()) {
         describe(*cached->second, found);
-    } else if (isRegularFile(assetPath(real).string())) {
+    } else if (canBeRead(assetPath(real).string())) {
         found.source = Resolution::FILE_SYSTEM;
         found.path = assetPath(real).string();
     }
@@ -426,7 +430,7 @@ void AssetManager::describe(const Opener& opener, Resolution& found) const {
             if (archive.second.get() == member->getArchive())
                 found.path = archive.first;
         }
-    } else if (isRegularFile(opener.getName())) {
+    } else if (canBeRead(opener.getName())) {
         found.source = Resolution::NEWER_FILE;
         found.path = opener.getName();
     }

@@ -103,7 +103,8 @@ public:
     /// "error", and the names known so far are returned.
     std::vector<std::string> listfiles(const std::string& dir, bool dirs) const;
 
-    /// Where getFileStream() would take a name from. Opens nothing and logs nothing.
+    /// Where getFileStream() would take a name from: NOWHERE also for a file that may not be read.
+    /// Leaves nothing open and logs nothing.
     Resolution resolve(const std::string& name) const;
 
     /// The largest number of aliases, 1,000,000 unless it was set. Where the ".symlinks" files
