@@ -8,6 +8,10 @@ baseiStreamContainer::~baseiStreamContainer() = default;
 
 iTemporaryStreamContainer::CantOpen::~CantOpen() = default;
 
+const char* iTemporaryStreamContainer::CantOpen::what() const noexcept {
+    return "no regular file of that name can be opened";
+}
+
 iTemporaryStreamContainer::iTemporaryStreamContainer(const std::string& path) {
     openRegularFile(file, path);
     if (!file.is_open())

@@ -24,6 +24,7 @@ public:
     /// There is no regular file of that name that may be read.
     struct PELLS_API CantOpen : public std::exception {
         ~CantOpen() override;
+        const char* what() const noexcept override;
     };
 
     /// Opens a regular file for reading, in binary mode.

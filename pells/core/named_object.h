@@ -27,7 +27,12 @@ template <class T, class P = T*>
 class PELLS_TEMPLATE_API NamedObject {
 public:
     /// Thrown by find() for a name that has no object.
-    class NotFound : public std::exception {};
+    class NotFound : public std::exception {
+    public:
+        const char* what() const noexcept override {
+            return "no object is registered under the name";
+        }
+    };
 
     NamedObject(const NamedObject&) = delete;
     NamedObject& operator=(const NamedObject&) = delete;

@@ -99,8 +99,8 @@ public:
 private:
     friend class SingletonFactory<ImageFallbackManager>;
 
-    /// \throws Serializable::LoadFail and what reading a damaged archive throws; the next
-    ///         instance() tries again.
+    /// \throws Serializable::LoadFail, XMLTokenizer::TooLarge for the root element, and what
+    ///         reading a damaged archive throws; the next instance() tries again.
     ImageFallbackManager();
 
     void readDefinitions(std::istream& in);
