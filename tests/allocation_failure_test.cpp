@@ -69,7 +69,7 @@ std::string readPictures() {
         if (!pells::TGAFileLoader::loadTarga(&image, in))
             return std::string();
         pixels.append(reinterpret_cast<const char*>(image.getData()),
-                      std::size_t(70 * 50 * image.getNumComponents()));
+                      std::size_t{70} * 50 * static_cast<std::size_t>(image.getNumComponents()));
     }
     return pixels;
 }

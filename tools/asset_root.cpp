@@ -38,7 +38,7 @@ void warnOfCutArchives(const std::string& root) {
             continue;
         const std::string reason = whereDirectoryIsMissing(path);
         if (!reason.empty())
-            warn("Bad .asset file: " + path + ": " + reason);
+            warn(pells::FileError("Bad .asset file: " + path, reason).what());
     }
 }
 

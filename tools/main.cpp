@@ -2,6 +2,7 @@
 #include <algorithm>
 #include <cstdio>
 #include <exception>
+#include <functional>
 #include <iterator>
 #include <sstream>
 #include <string>
@@ -43,7 +44,7 @@ std::vector<std::string> markedArguments(int argc, char** argv) {
 void removeMarks(CLI::App& app) {
     for (CLI::App* const command : app.get_subcommands({})) {
         for (CLI::Option* const option : command->get_options())
-            option->transform([](std::string argument) { return withoutMark(argument); });
+            option->transform(std::function<std::string(std::string)>(withoutMark));
     }
 }
 
