@@ -139,13 +139,17 @@ TEST_F(WorldFaults, WhatMayNotBeReadHidesItselfOnly) {
     write("open/inside", "y");
     write("open/.symlinks", "alias>inside\n");
     write("closed.asset", "no matter");
+    write("secret", "x");
     ASSERT_EQ(chmod("root/closed", 0), 0);
+    ASSERT_EQ(chmod("root/secret", 0), 0);
     ASSERT_EQ(chmod("root/closed.asset", 0), 0);
     ASSERT_EQ(chmod(".", 0777), 0);
     // No file can be closed to root.
     ASSERT_TRUE(geteuid() != 0 || seteuid(65534) == 0);
     EXPECT_EQ(read("open/alias"), "y");
     EXPECT_EQ(read("closed/inside"), "(null)");
+    EXPECT_EQ(manager().resolve("secret").source, pells::AssetManager::Resolution::NOWHERE);
+    EXPECT_EQ(manager().resolve("open/alias").path, "root/open/inside");
     EXPECT_EQ(manager().listfiles("closed", false), Lines());
     EXPECT_EQ(logLines("error: ").at(0),
               "Bad .asset file: root/closed.asset: Can't open pell file");

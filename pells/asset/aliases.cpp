@@ -67,12 +67,9 @@ struct AssetManager::DirNode {
 /// What a walk over the folders remembers: the folders that it is in, and how much more it may do.
 class AssetManager::FolderWalk {
 public:
-    /// What a folder or a member counts for beside its name.
-    static constexpr std::uint64_t nameOverhead = 32;
-
-    /// \param nameBytes characters in the names of all members, and a few more for each.
-    explicit FolderWalk(std::uint64_t nameBytes)
-        : pathsLeft(pathsPerByte * nameBytes + inProportion(pathsPerByte)) {
+    /// \param memberText see AssetManager::memberText.
+    explicit FolderWalk(std::uint64_t memberText)
+        : pathsLeft(pathsPerByte * memberText + inProportion(pathsPerByte)) {
         chain.push_back(Folder{assetPath(""), true, false, false, false});
     }
 
@@ -226,10 +223,7 @@ void AssetManager::setAliasLimit(std::size_t names) {
 }
 
 void AssetManager::buildAliases() {
-    std::uint64_t nameBytes = 0;
-    for (const Cache::value_type& entry : cache)
-        nameBytes += entry.first.size() + FolderWalk::nameOverhead;
-    FolderWalk walk(nameBytes);
+    FolderWalk walk(memberText);
     buildAliasMap(buildDirTree("", "", "", walk), "", false, walk);
 }
 

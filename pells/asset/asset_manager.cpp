@@ -245,6 +245,7 @@ void AssetManager::cacheMembers(pellistream& archive, std::int64_t writeTime) {
     Cache::iterator place = cache.begin();
     for (const auto& member : archive.getDirectory()) {
         PELLS_LOG("asset.entries", ">>> For this asset file, found entry: " << member.first);
+        memberText += member.first.size() + nameOverhead;
         const Cache::iterator entry = cache.try_emplace(place, member.first);
         place = std::next(entry);
         if (!entry->second || entry->second->getWriteTime() < writeTime)

@@ -153,6 +153,10 @@ private:
     Cache cache;
     std::unique_ptr<CacheIndex> cacheIndex;
     std::map<std::string, std::string> aliases;
+    /// What a name counts for beside its characters.
+    static constexpr std::uint64_t nameOverhead = 32;
+    /// The characters in the names of all members, and the overhead for each.
+    std::uint64_t memberText = 0;
     /// Last-write time of each archive.
     std::vector<std::int64_t> archiveTimes;
 };

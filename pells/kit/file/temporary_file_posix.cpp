@@ -17,6 +17,10 @@ namespace detail {
 
 namespace {
 
+#if !defined(O_PATH)
+const int O_PATH = O_RDONLY;
+#endif
+
 /// Keeps signals from the thread while a file is there that nobody has noted yet.
 class SignalsHeld {
 public:
