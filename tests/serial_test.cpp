@@ -132,6 +132,24 @@ TEST_F(SerialTest, LogsEveryTokenAndWhatItDoesNotKnow) {
     EXPECT_EQ(logLines("time.detail.parser: Entering next token"), Lines(tokens.size()));
 }
 
+// The innermost open element is known, however long its name and the names around it are.
+TEST_F(SerialTest, SkipsUnknownElementsWithNamesOfAnyLength) {
+    Everything object;
+    std::string open;
+    std::string close;
+    for (const std::size_t length :
+         {1u, 31u, 32u, 63u, 64u, 65u, 5000u, 2u, 70000u, 8191u, 8192u}) {
+        const std::string name(length, 'n');
+        open += '<' + name + '>';
+        close.insert(0, "<n/></" + name + '>');
+        EXPECT_EQ(failure(object, "<root>" + open + close + "<i>5</i></root>"), "") << length;
+        EXPECT_EQ(failure(object, "<root>" + open + "</x>" + close + "</root>"),
+                  "Malformed XML: bad close tag");
+        EXPECT_EQ(logLines("error: Malformed XML: <").back(), name + "> paired with </x>");
+    }
+    EXPECT_EQ(object.i, 5);
+}
+
 struct Undescribed : Serializable {};
 
 TEST_F(SerialTest, LogsItsErrors) {

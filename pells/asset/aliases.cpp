@@ -168,7 +168,9 @@ private:
             return true;
         }
         if (pathsLeft != 0)
-            PELLS_LOG("error", "Too long paths of folders in archives to look for aliases in all");
+            PELLS_LOG(
+                "error",
+                "Paths of folders in archives are too long to look for aliases in all of them");
         pathsLeft = 0;
         return false;
     }

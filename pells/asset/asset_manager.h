@@ -30,7 +30,8 @@ extern template class PELLS_API Singleton<AssetManager, SingletonFactory<AssetMa
 /// - Of several archives that hold a name, the one written last serves it. On equal times, which
 ///   are whole seconds, the one that the scan met first does, and the order of the scan is the file
 ///   system's: copying archives can change who wins.
-/// - A plain file that was written later than the archive is served instead of the member.
+/// - A plain file that was written later than the archive is served instead of the member. Whatever
+///   has that name counts for one, a folder too, which cannot be opened then.
 /// - Files named ".symlinks" declare aliases, see below. Every folder is asked for one, so each
 ///   folder without one leaves a line under "error" when that tag is on; that is normal.
 ///
@@ -86,7 +87,8 @@ public:
     ///     load(second->getStream());
     boost::intrusive_ptr<baseiStreamContainer> getFileStream(const std::string& name, bool flag);
 
-    /// Whether an archive has a member of that name or the root a file. Aliases do not count.
+    /// Whether an archive has a member of that name or the root anything but a folder, be it a pipe
+    /// that getFileStream() refuses. Aliases do not count.
     bool isFile(const std::string& name) const;
 
     /// Whether an archive has members below that name or the root such a folder. Aliases do not
@@ -96,7 +98,8 @@ public:
     /// The names of the files (`dirs` false) or the folders (`dirs` true) directly inside a folder,
     /// each once and in no particular order. Aliases do not count.
     ///
-    /// \param dir the folder's asset name, "" for the root.
+    /// \param dir the folder's asset name, "" for the root. Members are not found below a name that
+    ///            ends in "/", although isDir() may be true for it.
     ///
     /// Members of archives and what is on disk are listed alike, the archives themselves included.
     /// A folder that exists nowhere has no names; one that cannot be listed is reported under

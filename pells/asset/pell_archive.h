@@ -95,8 +95,9 @@ public:
     /// Opens an archive and reads its header and directory.
     ///
     /// \param path of a regular file; nothing else is opened, so that no pipe makes it wait.
-    /// \throws BadPellFile when the file cannot be opened or its header or directory is damaged.
-    ///         Memory is in proportion to the directory's bytes, whatever numbers it holds.
+    /// \throws BadPellFile when the file cannot be opened or its header or directory is damaged. A
+    ///         file that ends before its directory is an archive without members. Memory is in
+    ///         proportion to the directory's bytes, whatever numbers it holds.
     explicit basic_pellibuf(const std::string& path);
     ~basic_pellibuf() noexcept override;
 
