@@ -118,34 +118,34 @@ public:
         while (size < cache.size() * 3 / 2)
             size *= 2;
         slots.resize(size);
-        for (const Cache::value_type& entry : cache)
+        for (const Source& entry : cache)
             add(entry);
     }
 
-    Opener* find(const std::string& name) const {
+    const Source* find(const std::string& name) const {
         const std::size_t hash = std::hash<std::string>()(name);
         for (std::size_t step = 0; step < maxSteps; ++step) {
             const Slot& slot = slots[(hash + step) & (slots.size() - 1)];
             if (!slot.entry)
                 return nullptr;
-            if (slot.hash == hash && slot.entry->first == name)
-                return slot.entry->second.get();
+            if (slot.hash == hash && slot.entry->name() == name)
+                return slot.entry;
         }
         const Cache::const_iterator found = cache.find(name);
-        return found == cache.end() ? nullptr : found->second.get();
+        return found == cache.end() ? nullptr : &*found;
     }
 
 private:
     struct Slot {
         std::size_t hash = 0;
-        const Cache::value_type* entry = nullptr;
+        const Source* entry = nullptr;
     };
 
     /// Names that were chosen to have the same place stay in the tree.
     static const std::size_t maxSteps = 64;
 
-    void add(const Cache::value_type& entry) {
-        const std::size_t hash = std::hash<std::string>()(entry.first);
+    void add(const Source& entry) {
+        const std::size_t hash = std::hash<std::string>()(entry.name());
         for (std::size_t step = 0; step < maxSteps; ++step) {
             Slot& slot = slots[(hash + step) & (slots.size() - 1)];
             if (!slot.entry) {
@@ -237,33 +237,44 @@ void AssetManager::addArchive(const std::string& path) {
         writeTime = fs::last_write_time(path);
     archiveTimes.push_back(writeTime);
     archives.emplace_back(path, std::move(archive));
-    cacheMembers(*archives.back().second, writeTime);
+    cacheMembers(static_cast<std::uint32_t>(archives.size() - 1));
 }
 
-void AssetManager::cacheMembers(pellistream& archive, std::int64_t writeTime) {
+void AssetManager::cacheMembers(std::uint32_t archive) {
+    const std::int64_t writeTime = archiveTimes[archive];
     // An archive's names are sorted, too, so most go right behind the one before.
-    Cache::iterator place = cache.begin();
-    for (const auto& member : archive.getDirectory()) {
+    Cache::const_iterator place = cache.begin();
+    for (const auto& member : archives[archive].second->getDirectory()) {
         PELLS_LOG("asset.entries", ">>> For this asset file, found entry: " << member.first);
         memberText += member.first.size() + nameOverhead;
-        const Cache::iterator entry = cache.try_emplace(place, member.first);
+        const Source source = {&member, archive};
+        const Cache::const_iterator entry = cache.insert(place, source);
         place = std::next(entry);
-        if (!entry->second || entry->second->getWriteTime() < writeTime)
-            entry->second.reset(new MemberOpener(member, writeTime, &archive));
+        if (archiveTimes[entry->archive] < writeTime)
+            setSource(entry, source);
     }
+}
+
+/// Replaces an entry by one of the same name.
+void AssetManager::setSource(Cache::const_iterator entry, const Source& source) {
+    // Entries of a set are constant, so that nobody changes their order, which this does not.
+    const_cast<Source&>(*entry) = source;
 }
 
 void AssetManager::preferNewerFiles(const std::string& root) {
     MissingFolders missingFolders(root);
-    for (Cache::value_type& entry : cache) {
-        if (missingFolders.hold(entry.first) || !isNativeName(entry.first))
+    for (auto entry = cache.begin(); entry != cache.end(); ++entry) {
+        const std::string& name = entry->name();
+        if (missingFolders.hold(name) || !isNativeName(name))
             continue;
-        const fs::path file = fs::path(root) / entry.first;
+        const fs::path file = fs::path(root) / name;
         boost::system::error_code error;
         const std::int64_t writeTime = fs::last_write_time(file, error);
         if (!error) {
-            if (writeTime > entry.second->getWriteTime())
-                entry.second.reset(new FileOpener(file.string(), writeTime));
+            if (writeTime > archiveTimes[entry->archive]) {
+                newerFiles[name] = new FileOpener(file.string(), writeTime);
+                setSource(entry, {entry->member, newerFile});
+            }
         } else if (typeOf(file) != fs::file_not_found) {
             const fs::filesystem_error reason("last_write_time", file, error);
             PELLS_LOG("error",
@@ -290,15 +301,15 @@ boost::intrusive_ptr<baseiStreamContainer> AssetManager::getFileStream(const std
     std::string converted;
     const std::string& fixed = fixedName(name, converted);
     const OpeningPrefix prefix(*this, fixed);
-    if (Opener* const cached = cacheIndex->find(fixed)) {
+    if (const Source* const cached = cacheIndex->find(fixed)) {
         PELLS_LOG("asset.open", prefix << "found in cache");
-        return cached->open(flag);
+        return openCached(*cached, flag);
     }
     const auto alias = aliases.find(fixed);
     if (alias != aliases.end()) {
-        if (Opener* const cached = cacheIndex->find(alias->second)) {
+        if (const Source* const cached = cacheIndex->find(alias->second)) {
             PELLS_LOG("asset.open", prefix << "not in cache, but alias is: " << alias->second);
-            return cached->open(flag);
+            return openCached(*cached, flag);
         }
         PELLS_LOG("asset.open", prefix << "alias not in cache: " << alias->second);
     }
@@ -306,6 +317,14 @@ boost::intrusive_ptr<baseiStreamContainer> AssetManager::getFileStream(const std
     PELLS_LOG("asset.open", prefix << real << " not in cache, trying filesystem");
     const boost::intrusive_ptr<Opener> opener(new FileOpener(assetPath(real).string(), 0));
     return opener->open(flag);
+}
+
+boost::intrusive_ptr<baseiStreamContainer> AssetManager::openCached(const Source& source,
+                                                                    bool flag) {
+    if (source.archive == newerFile)
+        return newerFiles.find(source.name())->second->open(flag);
+    pellistream* const archive = archives[source.archive].second.get();
+    return MemberOpener(*source.member, archiveTimes[source.archive], archive).open(flag);
 }
 
 bool AssetManager::isFile(const std::string& name) const {
@@ -344,7 +363,7 @@ void AssetManager::listCached(const std::string& dir, bool dirs, const ListingPr
     const std::string::size_type start = dir.empty() ? 0 : dir.size() + 1;
     const CacheRange range = getSubdirRange(dir);
     for (Cache::const_iterator entry = range.first; entry != range.second;) {
-        const std::string& key = entry->first;
+        const std::string& key = entry->name();
         const std::string::size_type slash = key.find('/', start);
         const bool inSubdir = slash != std::string::npos;
         PELLS_LOG("asset.iter", prefix << "considering " << key);
@@ -404,36 +423,36 @@ AssetManager::Resolution AssetManager::resolve(const std::string& name) const {
         cached = cache.find(real);
     }
     if (cached != cache.end()) {
-        describe(*cached->second, found);
+        describe(*cached, found);
     } else if (canBeRead(assetPath(real).string())) {
         found.source = Resolution::FILE_SYSTEM;
         found.path = assetPath(real).string();
     }
-    const std::int64_t writeTime = cached == cache.end() ? 0 : cached->second->getWriteTime();
     for (std::size_t i = 0; cached != cache.end() && i < archives.size(); ++i) {
         const bool serves =
             found.source == Resolution::ARCHIVE_MEMBER && found.path == archives[i].first;
         if (serves || archives[i].second->getDirectory().count(real) == 0)
             continue;
         found.overridden.push_back(archives[i].first);
-        if (found.source == Resolution::ARCHIVE_MEMBER && archiveTimes[i] == writeTime)
+        if (found.source == Resolution::ARCHIVE_MEMBER &&
+            archiveTimes[i] == archiveTimes[cached->archive])
             found.tie = true;
     }
     return found;
 }
 
-/// Fills in what an opener of the cache says.
-void AssetManager::describe(const Opener& opener, Resolution& found) const {
-    if (const auto* member = dynamic_cast<const MemberOpener*>(&opener)) {
+/// Fills in what an entry of the cache says.
+void AssetManager::describe(const Source& source, Resolution& found) const {
+    if (source.archive != newerFile) {
         found.source = Resolution::ARCHIVE_MEMBER;
-        found.member = member->getName();
-        for (const auto& archive : archives) {
-            if (archive.second.get() == member->getArchive())
-                found.path = archive.first;
-        }
-    } else if (canBeRead(opener.getName())) {
+        found.member = source.name();
+        found.path = archives[source.archive].first;
+        return;
+    }
+    const std::string& path = newerFiles.find(source.name())->second->getName();
+    if (canBeRead(path)) {
         found.source = Resolution::NEWER_FILE;
-        found.path = opener.getName();
+        found.path = path;
     }
 }
 

@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <map>
 #include <memory>
+#include <set>
 #include <string>
 #include <utility>
 #include <vector>
@@ -121,7 +122,24 @@ public:
 
 private:
     friend class SingletonFactory<AssetManager>;
-    typedef std::map<std::string, boost::intrusive_ptr<Opener>> Cache;
+
+    /// Which archive, or newer file, serves a name. There is one for each name in the archives, so
+    /// it keeps no copy of the name, and openers are made when they are asked for.
+    struct Source {
+        const std::string& name() const { return member->first; }
+
+        const pellistream::Directory::value_type* member;
+        std::uint32_t archive;  ///< its place among the archives, or newerFile
+    };
+    static constexpr std::uint32_t newerFile = static_cast<std::uint32_t>(-1);
+
+    struct ByName {
+        typedef void is_transparent;
+        bool operator()(const Source& a, const Source& b) const { return a.name() < b.name(); }
+        bool operator()(const Source& a, const std::string& b) const { return a.name() < b; }
+        bool operator()(const std::string& a, const Source& b) const { return a < b.name(); }
+    };
+    typedef std::set<Source, ByName> Cache;
     typedef std::pair<Cache::const_iterator, Cache::const_iterator> CacheRange;
     class CacheIndex;
     struct DirNode;
@@ -133,7 +151,8 @@ private:
 
     void scanRoot(const std::string& root);
     void addArchive(const std::string& path);
-    void cacheMembers(pellistream& archive, std::int64_t writeTime);
+    void cacheMembers(std::uint32_t archive);
+    static void setSource(Cache::const_iterator entry, const Source& source);
     void preferNewerFiles(const std::string& root);
     void buildAliases();
 
@@ -143,7 +162,8 @@ private:
                     std::vector<std::string>& names) const;
     void listFileSystem(const std::string& dir, bool dirs, const ListingPrefix& prefix,
                         std::vector<std::string>& names) const;
-    void describe(const Opener& opener, Resolution& found) const;
+    boost::intrusive_ptr<baseiStreamContainer> openCached(const Source& source, bool flag);
+    void describe(const Source& source, Resolution& found) const;
 
     boost::shared_ptr<DirNode> buildDirTree(const std::string& path, const std::string& name,
                                             const std::string& separator, FolderWalk& walk);
@@ -154,6 +174,7 @@ private:
 
     std::vector<std::pair<std::string, std::unique_ptr<pellistream>>> archives;
     Cache cache;
+    std::map<std::string, boost::intrusive_ptr<Opener>> newerFiles;
     std::unique_ptr<CacheIndex> cacheIndex;
     std::map<std::string, std::string> aliases;
     /// What a name counts for beside its characters.

@@ -144,9 +144,13 @@ void TemporaryFile::keepPermissions() {
         throw FileError(destination, std::string("Not a regular file"));
     const int descriptor = ::fileno(file);
     // Not everybody may; before the mode, as it takes bits away.
-    static_cast<void>(::fchown(descriptor, old.st_uid, old.st_gid) == 0 ||
-                      ::fchown(descriptor, static_cast<uid_t>(-1), old.st_gid) == 0);
-    if (::fchmod(descriptor, old.st_mode & 07777) != 0)
+    const bool keepsGroup = ::fchown(descriptor, old.st_uid, old.st_gid) == 0 ||
+                            ::fchown(descriptor, static_cast<uid_t>(-1), old.st_gid) == 0;
+    mode_t mode = old.st_mode & 07777;
+    // Another group gets no more than everybody.
+    if (!keepsGroup)
+        mode &= ~static_cast<mode_t>(070) | (mode & 07) << 3;
+    if (::fchmod(descriptor, mode) != 0)
         throw FileError(destination, errno);
 }
 
