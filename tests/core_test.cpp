@@ -1,4 +1,5 @@
 #include <boost/lexical_cast.hpp>
+#include <boost/smart_ptr/intrusive_ptr.hpp>
 #include <sstream>
 
 #include "pells/core/factory.h"

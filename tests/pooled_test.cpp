@@ -1,4 +1,4 @@
-#include "pells/serial/pooled.h"
+#include "pells/serial/detail/pooled.h"
 
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+#include "pells/core/factory.h"
 #include "pells/serial/member_field.h"
 #include "pells/undo/undo_redo_sequence.h"
 #include "support/documents.h"

@@ -1,13 +1,11 @@
 #pragma once
 
-#include <boost/shared_ptr.hpp>
+#include <boost/smart_ptr/intrusive_ptr.hpp>
 #include <cstddef>
 #include <cstdint>
 #include <map>
 #include <memory>
-#include <set>
 #include <string>
-#include <utility>
 #include <vector>
 
 #include "pells/asset/pell_archive.h"
@@ -15,6 +13,11 @@
 #include "pells/core/singleton.h"
 
 namespace pells {
+
+namespace detail {
+class AssetIndex;
+struct AssetSource;
+}  // namespace detail
 
 class AssetManager;
 extern template class PELLS_API RogueSingleton<AssetManager, SingletonFactory<AssetManager>>;
@@ -123,66 +126,15 @@ public:
 private:
     friend class SingletonFactory<AssetManager>;
 
-    /// Which archive, or newer file, serves a name. There is one for each name in the archives, so
-    /// it keeps no copy of the name, and openers are made when they are asked for.
-    struct Source {
-        const std::string& name() const { return member->first; }
-
-        const pellistream::Directory::value_type* member;
-        std::uint32_t archive;  ///< its place among the archives, or newerFile
-    };
-    static constexpr std::uint32_t newerFile = static_cast<std::uint32_t>(-1);
-
-    struct ByName {
-        typedef void is_transparent;
-        bool operator()(const Source& a, const Source& b) const { return a.name() < b.name(); }
-        bool operator()(const Source& a, const std::string& b) const { return a.name() < b; }
-        bool operator()(const std::string& a, const Source& b) const { return a < b.name(); }
-    };
-    typedef std::set<Source, ByName> Cache;
-    typedef std::pair<Cache::const_iterator, Cache::const_iterator> CacheRange;
-    class CacheIndex;
-    struct DirNode;
-    class FolderWalk;
-    class ListingPrefix;
     class OpeningPrefix;
 
     AssetManager();
 
-    void scanRoot(const std::string& root);
-    void addArchive(const std::string& path);
-    void cacheMembers(std::uint32_t archive);
-    static void setSource(Cache::const_iterator entry, const Source& source);
-    void preferNewerFiles(const std::string& root);
-    void buildAliases();
+    void describe(const detail::AssetSource& source, Resolution& found) const;
+    void describeOverridden(const detail::AssetSource& source, Resolution& found) const;
 
-    CacheRange getSubdirRange(const std::string& dir) const;
-    std::vector<std::string> listFolder(const std::string& dir, bool dirs, bool onDisk) const;
-    void listCached(const std::string& dir, bool dirs, const ListingPrefix& prefix,
-                    std::vector<std::string>& names) const;
-    void listFileSystem(const std::string& dir, bool dirs, const ListingPrefix& prefix,
-                        std::vector<std::string>& names) const;
-    boost::intrusive_ptr<baseiStreamContainer> openCached(const Source& source, bool flag);
-    void describe(const Source& source, Resolution& found) const;
-
-    boost::shared_ptr<DirNode> buildDirTree(const std::string& path, const std::string& name,
-                                            const std::string& separator, FolderWalk& walk);
-    void readLinks(DirNode& node, FolderWalk& walk);
-    void buildAliasMap(const boost::shared_ptr<DirNode>& node, const std::string& prefix,
-                       bool linked, FolderWalk& walk);
-    bool addAlias(const std::string& from, const std::string& to, FolderWalk& walk);
-
-    std::vector<std::pair<std::string, std::unique_ptr<pellistream>>> archives;
-    Cache cache;
-    std::map<std::string, boost::intrusive_ptr<Opener>> newerFiles;
-    std::unique_ptr<CacheIndex> cacheIndex;
+    std::unique_ptr<detail::AssetIndex> index;
     std::map<std::string, std::string> aliases;
-    /// What a name counts for beside its characters.
-    static constexpr std::uint64_t nameOverhead = 32;
-    /// The characters in the names of all members, and the overhead for each.
-    std::uint64_t memberText = 0;
-    /// Last-write time of each archive.
-    std::vector<std::int64_t> archiveTimes;
 };
 
 /// Where one asset lies and how it is opened.

@@ -6,8 +6,8 @@
 #include <locale>
 #include <sstream>
 
-#include "pells/asset/archive_file.h"
-#include "pells/asset/pell_directory.h"
+#include "pells/asset/detail/archive_file.h"
+#include "pells/asset/detail/pell_directory.h"
 #include "pells/core/version.h"
 
 namespace pells {
@@ -82,11 +82,11 @@ basic_pellibuf<C, Traits>::BadPellFile::~BadPellFile() = default;
 
 template <class C, class Traits>
 basic_pellibuf<C, Traits>::basic_pellibuf(const std::string& path)
-    : basic_pellibuf(std::make_unique<ArchiveFile>(path), Directory()) {
+    : basic_pellibuf(std::make_unique<detail::ArchiveFile>(path), Directory()) {
     if (stream->fail())
         throw BadPellFile("Can't open pell file");
     readHeader();
-    readPellDirectory(*stream, directory);
+    detail::readPellDirectory(*stream, directory);
 }
 
 template <class C, class Traits>
@@ -116,8 +116,8 @@ basic_pellibuf<C, Traits>::~basic_pellibuf() noexcept try {
 
 template <class C, class Traits>
 bool basic_pellibuf<C, Traits>::getWriteTime(std::int64_t& seconds) const {
-    platform::RegularFile::Identity identity{};
-    if (!static_cast<const ArchiveFile&>(*stream).getFile().identify(identity))
+    detail::RegularFile::Identity identity{};
+    if (!static_cast<const detail::ArchiveFile&>(*stream).getFile().identify(identity))
         return false;
     seconds = identity.writeTime;
     return true;

@@ -1,6 +1,6 @@
 #include "pells/asset/stream_container.h"
 
-#include "pells/asset/regular_file.h"
+#include "pells/asset/detail/regular_file.h"
 
 namespace pells {
 
@@ -13,7 +13,7 @@ const char* iTemporaryStreamContainer::CantOpen::what() const noexcept {
 }
 
 iTemporaryStreamContainer::iTemporaryStreamContainer(const std::string& path) {
-    openRegularFile(file, path);
+    detail::openRegularFile(file, path);
     if (!file.is_open())
         throw CantOpen();
 }

@@ -130,4 +130,6 @@ public:
         : Factory<Serializable, T>(className) {}
 };
 
+extern template class PELLS_API AbstractFactory<Serializable>;
+
 }  // namespace pells

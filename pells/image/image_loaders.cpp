@@ -5,10 +5,10 @@
 #include <utility>
 
 #include "pells/asset/asset_manager.h"
-#include "pells/asset/known_archive.h"
+#include "pells/asset/detail/known_archive.h"
 #include "pells/asset/pell_archive.h"
 #include "pells/core/factory.h"
-#include "pells/image/loader_factories.h"
+#include "pells/image/detail/loader_factories.h"
 #include "pells/log/log.h"
 #include "pells/serial/member_field.h"
 
@@ -21,7 +21,7 @@ const SerializableFactory<PellTGAFileLoader> pellTgaFileLoaderFactory("PellTGAFi
 
 }  // namespace
 
-void keepLoaderFactories() {}
+void detail::keepLoaderFactories() {}
 
 ImageLoaderBase::~ImageLoaderBase() = default;
 
@@ -68,7 +68,7 @@ bool PellTGAFileLoader::uploadImage(Image_base* image) {
         return false;
     try {
         // Without such a member the stream is empty, which the reader reports.
-        return loadTarga(image, *openKnownMember(fileName, "tga"));
+        return loadTarga(image, *detail::openKnownMember(fileName, "tga"));
     } catch (const pellibuf::BadPellFile& failure) {
         PELLS_LOG("error", prefix << "Can't read pell file: " << failure.what());
     } catch (const std::exception& failure) {

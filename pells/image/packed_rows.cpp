@@ -5,7 +5,7 @@
 #include <cstddef>
 #include <cstdint>
 
-#include "pells/image/channel_order.h"
+#include "pells/image/detail/channel_order.h"
 #include "pells/image/image_base.h"
 
 namespace pells {
@@ -30,7 +30,7 @@ void packOpaque(const unsigned char* pixels, std::size_t count, Packed* row, Pac
     unsigned char block[4 * blockPixels];
     for (std::size_t done = 0; done < count; done += blockPixels) {
         const std::size_t now = std::min(blockPixels, count - done);
-        copyOpaque(pixels + 3 * done, block, now);
+        detail::copyOpaque(pixels + 3 * done, block, now);
         packAll(block, now, row + done, pack);
     }
 }

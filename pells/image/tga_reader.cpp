@@ -9,7 +9,7 @@
 #include <streambuf>
 #include <utility>
 
-#include "pells/image/channel_order.h"
+#include "pells/image/detail/channel_order.h"
 #include "pells/image/image_base.h"
 #include "pells/image/image_loaders.h"
 #include "pells/log/log.h"
@@ -123,7 +123,7 @@ public:
         while (size != 0) {
             const std::size_t run = std::min(size, rowBytes - column);
             const std::size_t place = topFirst ? row : capacity - 1 - row;
-            copySwapped(piece, &bytes[place * rowBytes + column], run, components);
+            detail::copySwapped(piece, &bytes[place * rowBytes + column], run, components);
             piece += run;
             size -= run;
             column = 0;

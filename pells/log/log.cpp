@@ -7,9 +7,9 @@
 
 #include "pells/core/no_destructor.h"
 #include "pells/core/prefs.h"
-#include "pells/log/exit_hooks.h"
-#include "pells/log/log_file.h"
-#include "pells/log/number_format.h"
+#include "pells/log/detail/exit_hooks.h"
+#include "pells/log/detail/log_file.h"
+#include "pells/log/detail/number_format.h"
 
 namespace pells {
 
@@ -40,7 +40,7 @@ public:
 /// summary is written before the log lists its tags and closes.
 [[maybe_unused]] const bool exitHooksInstalled = [] {
     static LogExitHook logExitHook;
-    installTimeSummaryHook();
+    detail::installTimeSummaryHook();
     return true;
 }();
 
@@ -62,7 +62,7 @@ std::string& fileName() {
 ///            out then.
 std::string readPrefsFile(bool& cut) {
     std::string text;
-    platform::RegularFile file;
+    detail::RegularFile file;
     if (!file.openToRead(prefsFileName))
         return text;
     char piece[4096];
@@ -106,13 +106,13 @@ void Log::setMaximumRulesSize(std::size_t bytes) {
 
 Log::Log()
     : rulesWereCut(false),
-      logFile(std::make_unique<LogFile>(fileName())),
+      logFile(std::make_unique<detail::LogFile>(fileName())),
       flushEach(false),
       teeStream(debugStream, *logFile),
       serialNumber(++logsMade) {
     // An application that has chosen another locale for its streams finds its forms in the log.
     if (teeStream.getloc() == std::locale::classic())
-        teeStream.imbue(fastClassicLocale());
+        teeStream.imbue(detail::fastClassicLocale());
     readRules();
     writeHeader();
     flushEach = isEnabled("log.flush", true);

@@ -16,7 +16,9 @@
 namespace pells {
 
 class Log;
+namespace detail {
 class LogFile;
+}
 class LogKey;
 class RecurringTag;
 extern template class PELLS_API RogueSingleton<Log, SingletonFactory<Log>>;
@@ -102,7 +104,7 @@ private:
     std::list<std::pair<bool, std::string>> rules;
     std::map<std::string, TagState> tagTable;
     bool rulesWereCut;
-    std::unique_ptr<LogFile> logFile;
+    std::unique_ptr<detail::LogFile> logFile;
     bool flushEach;
     debugostream debugStream;
     tee_ostream<> teeStream;

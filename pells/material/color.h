@@ -3,6 +3,7 @@
 #include <cstdint>
 
 #include "pells/core/export.h"
+#include "pells/serial/type_handler.h"
 
 namespace pells {
 
@@ -46,5 +47,18 @@ PELLS_API std::uint32_t hsv2rgb(std::uint32_t hsv);
 ///         takes the hue of the other colour, and two greys give the second one's hue.
 PELLS_API Color HSVInterpolate(float hue1, float sat1, float val1, float hue2, float sat2,
                                float val2, double t);
+
+/// Writes a colour as the attributes "r", "g", "b" and "a" of an empty element, with six digits.
+///
+/// A component whose attribute is missing, or does not start with a number, keeps its value.
+template <>
+class PELLS_API SimpleTypeHandler<Color> : public TypeHandler<Color> {
+public:
+    void save(const Color& value, OutTag& tag) override;
+
+    /// \throws Serializable::LoadFail "Failed to scan text value" for an attribute that goes on
+    ///         after its number; the colour is unchanged then.
+    void load(Color& value, InTag& tag) override;
+};
 
 }  // namespace pells

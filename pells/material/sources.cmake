@@ -1,3 +1,3 @@
 pells_sources(material
     HEADERS color.h material.h
-    SOURCES color.cpp material.cpp)
+    SOURCES color.cpp color_handler.cpp material.cpp)

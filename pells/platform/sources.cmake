@@ -1,2 +1,3 @@
-pells_sources(
-    platform HEADERS counter.h debugger.h SOURCES counter.cpp debugger.cpp regular_file.cpp)
+pells_sources(platform
+    HEADERS counter.h debugger.h
+    SOURCES counter.cpp debugger.cpp detail/regular_file.cpp)

@@ -7,7 +7,7 @@
 #include "pells/core/export.h"
 #include "pells/core/no_destructor.h"
 #include "pells/core/smart_base.h"
-#include "pells/serial/pooled.h"
+#include "pells/serial/detail/pooled.h"
 #include "pells/serial/serializable.h"
 
 namespace pells {

@@ -7,8 +7,8 @@
 #include <vector>
 
 #include "pells/core/export.h"
+#include "pells/serial/detail/pooled.h"
 #include "pells/serial/field.h"
-#include "pells/serial/pooled.h"
 
 namespace pells {
 

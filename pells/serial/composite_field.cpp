@@ -6,7 +6,7 @@
 
 #include "pells/core/no_destructor.h"
 #include "pells/log/log.h"
-#include "pells/serial/nesting.h"
+#include "pells/serial/detail/nesting.h"
 #include "pells/xml/tag.h"
 
 namespace pells {

@@ -7,7 +7,7 @@
 #include <typeinfo>
 
 #include "pells/core/export.h"
-#include "pells/core/factory.h"
+#include "pells/serial/detail/object_factories.h"
 #include "pells/serial/serializable.h"
 #include "pells/serial/type_handler.h"
 #include "pells/xml/tag.h"
@@ -50,14 +50,14 @@ template <class P, class B>
 void PolymorphicTypeHandler<P, B>::save(const P& value, OutTag& tag) {
     if (!value)
         return;
-    tag.setAttr("class", AbstractFactory<Serializable>::classNameOf(typeid(*value).name()));
+    tag.setAttr("class", detail::registeredName(typeid(*value)));
     value->save(tag);
 }
 
 template <class P, class B>
 void PolymorphicTypeHandler<P, B>::load(P& value, InTag& tag) {
     const std::string& className = tag.getAttr("class");
-    std::unique_ptr<Serializable> made(AbstractFactory<Serializable>::createByName(className));
+    std::unique_ptr<Serializable> made = detail::makeObject(className);
     value = P(dynamic_cast<B*>(made.get()));
     if (!value) {
         throw Serializable::LoadFail("Bad class='" + className + "' in element <" + tag.getName() +

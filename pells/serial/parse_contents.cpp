@@ -188,4 +188,11 @@ void SingleTag::parseContents(Serializable* obj, const ClassDesc& desc) {
         field->load(obj, *this);
 }
 
+void InTag::checkEndText(std::istream& in) const {
+    for (char c; in.get(c);) {
+        if (!std::isspace(c, std::locale::classic()))
+            throw Serializable::LoadFail("Failed to scan text value");
+    }
+}
+
 }  // namespace pells

@@ -10,7 +10,7 @@
 #include "pells/core/strings.h"
 #include "pells/serial/accessor.h"
 #include "pells/serial/class_desc.h"
-#include "pells/serial/nesting.h"
+#include "pells/serial/detail/nesting.h"
 #include "pells/serial/simple_field.h"
 #include "pells/serial/simple_type_handler.h"
 #include "pells/serial/type_handler.h"

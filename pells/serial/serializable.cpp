@@ -1,16 +1,10 @@
 #include "pells/serial/serializable.h"
 
 #include "pells/core/class_name.h"
-#include "pells/image/loader_factories.h"
 #include "pells/log/log.h"
 #include "pells/xml/tag.h"
 
 namespace pells {
-
-template class AbstractFactory<Serializable>;
-
-// Who creates objects by class name should find the library's own classes in a static library, too.
-[[maybe_unused]] static const bool loaderFactoriesAreKept = (keepLoaderFactories(), true);
 
 Serializable::SaveFail::SaveFail(const std::string& message) : std::runtime_error(message) {
     PELLS_LOG("error", "SaveFail: " << message);

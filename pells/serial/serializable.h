@@ -5,7 +5,6 @@
 #include <string>
 
 #include "pells/core/export.h"
-#include "pells/core/factory.h"
 #include "pells/serial/field.h"
 
 namespace pells {
@@ -84,7 +83,5 @@ protected:
 private:
     boost::intrusive_ptr<Field> mustGetField(const std::string& name, const char* method);
 };
-
-extern template class PELLS_API AbstractFactory<Serializable>;
 
 }  // namespace pells

@@ -5,7 +5,6 @@
 #include <type_traits>
 
 #include "pells/core/export.h"
-#include "pells/material/color.h"
 #include "pells/serial/object_handlers.h"
 #include "pells/serial/text_handler.h"
 #include "pells/serial/type_handler.h"
@@ -68,18 +67,5 @@ class PELLS_TEMPLATE_API SimpleTypeHandler : public detail::HandlerOf<T>::type {
 extern template class PELLS_API SimpleTypeHandler<std::string>;
 extern template class PELLS_API SimpleTypeHandler<float>;
 extern template class PELLS_API SimpleTypeHandler<bool>;
-
-/// Writes a colour as the attributes "r", "g", "b" and "a" of an empty element, with six digits.
-///
-/// A component whose attribute is missing, or does not start with a number, keeps its value.
-template <>
-class PELLS_API SimpleTypeHandler<Color> : public TypeHandler<Color> {
-public:
-    void save(const Color& value, OutTag& tag) override;
-
-    /// \throws Serializable::LoadFail "Failed to scan text value" for an attribute that goes on
-    ///         after its number; the colour is unchanged then.
-    void load(Color& value, InTag& tag) override;
-};
 
 }  // namespace pells

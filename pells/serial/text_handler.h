@@ -6,9 +6,9 @@
 
 #include "pells/core/export.h"
 #include "pells/serial/class_desc.h"
+#include "pells/serial/detail/nesting.h"
+#include "pells/serial/detail/text_form.h"
 #include "pells/serial/field.h"
-#include "pells/serial/nesting.h"
-#include "pells/serial/text_form.h"
 #include "pells/serial/type_handler.h"
 #include "pells/xml/tag.h"
 

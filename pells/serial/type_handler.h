@@ -3,7 +3,7 @@
 #include "pells/core/export.h"
 #include "pells/core/no_destructor.h"
 #include "pells/core/smart_base.h"
-#include "pells/serial/pooled.h"
+#include "pells/serial/detail/pooled.h"
 
 namespace pells {
 
@@ -23,6 +23,10 @@ public:
     /// \throws Serializable::LoadFail
     virtual void load(T& value, InTag& tag) = 0;
 };
+
+/// The handler of every type that is no vector, see simple_type_handler.h.
+template <class T>
+class SimpleTypeHandler;
 
 namespace detail {
 

@@ -1,4 +1,3 @@
-#include "pells/serial/composite_field.h"
 #include "pells/serial/simple_type_handler.h"
 
 namespace pells {
@@ -9,23 +8,5 @@ template class TextTypeHandler<bool>;
 template class SimpleTypeHandler<std::string>;
 template class SimpleTypeHandler<float>;
 template class SimpleTypeHandler<bool>;
-
-void SimpleTypeHandler<Color>::save(const Color& value, OutTag& tag) {
-    tag.setAttr("r", detail::formatFloat(static_cast<double>(value.r)));
-    tag.setAttr("g", detail::formatFloat(static_cast<double>(value.g)));
-    tag.setAttr("b", detail::formatFloat(static_cast<double>(value.b)));
-    tag.setAttr("a", detail::formatFloat(static_cast<double>(value.a)));
-    tag.writeSingleTag();
-}
-
-void SimpleTypeHandler<Color>::load(Color& value, InTag& tag) {
-    Color scanned = value;
-    detail::scanNumber(tag.getAttr("r"), tag, scanned.r);
-    detail::scanNumber(tag.getAttr("g"), tag, scanned.g);
-    detail::scanNumber(tag.getAttr("b"), tag, scanned.b);
-    detail::scanNumber(tag.getAttr("a"), tag, scanned.a);
-    value = scanned;
-    tag.parseContents(nullptr, IgnoreField::emptyDesc());
-}
 
 }  // namespace pells

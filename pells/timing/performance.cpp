@@ -5,7 +5,7 @@
 #include <sstream>
 
 #include "pells/core/no_destructor.h"
-#include "pells/log/exit_hooks.h"
+#include "pells/log/detail/exit_hooks.h"
 #include "pells/platform/counter.h"
 
 namespace pells {
@@ -73,7 +73,7 @@ public:
 
 }  // namespace
 
-void installTimeSummaryHook() {
+void detail::installTimeSummaryHook() {
     static TimeSummaryHook hook;
 }
 

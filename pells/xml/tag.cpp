@@ -4,12 +4,13 @@
 #include <cstring>
 #include <limits>
 #include <locale>
+#include <ostream>
+#include <sstream>
 #include <utility>
 #include <vector>
 
 #include "pells/core/no_destructor.h"
-#include "pells/serial/serializable.h"
-#include "pells/xml/scan.h"
+#include "pells/xml/detail/scan.h"
 
 namespace pells {
 
@@ -62,13 +63,6 @@ std::istringstream& InTag::textStream() {
         scanner->imbue(std::locale::classic());
     }
     return *scanner;
-}
-
-void InTag::checkEndText(std::istream& in) const {
-    for (char c; in.get(c);) {
-        if (!std::isspace(c, std::locale::classic()))
-            throw Serializable::LoadFail("Failed to scan text value");
-    }
 }
 
 unsigned InTag::maximumDepth() {
@@ -207,7 +201,7 @@ public:
     }
 
     Line& appendEscaped(const std::string& text) {
-        const EndOfValue isSpecial{'"'};
+        const detail::EndOfValue isSpecial{'"'};
         const char* done = text.data();
         const char* const end = done + text.size();
         for (const char* at; (at = scan(done, end, isSpecial)) != end; done = at + 1) {

@@ -2,10 +2,8 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <istream>
+#include <iosfwd>
 #include <memory>
-#include <ostream>
-#include <sstream>
 #include <string>
 
 #include "pells/core/export.h"

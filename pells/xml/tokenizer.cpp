@@ -7,10 +7,10 @@
 #include <string_view>
 #include <type_traits>
 
-#include "pells/xml/char_class.h"
-#include "pells/xml/plain_token.h"
-#include "pells/xml/scan.h"
-#include "pells/xml/stream_window.h"
+#include "pells/xml/detail/char_class.h"
+#include "pells/xml/detail/plain_token.h"
+#include "pells/xml/detail/scan.h"
+#include "pells/xml/detail/stream_window.h"
 
 namespace pells {
 
@@ -100,11 +100,13 @@ private:
     template <class Text>
     bool readValue(Text& value);
     bool readReference(char& decoded);
-    bool readNumber(CharClass digits, unsigned base, char& decoded);
+    bool readNumber(detail::CharClass digits, unsigned base, char& decoded);
     bool readEntity(char& decoded);
 
     bool at(char wanted) { return window.more() && *window.next == wanted; }
-    bool atAny(unsigned char classes) { return window.more() && isOf(classes, *window.next); }
+    bool atAny(unsigned char classes) {
+        return window.more() && detail::isOf(classes, *window.next);
+    }
     bool expect(char wanted);
     bool expect(const char* wanted);
     bool skipSpace();
@@ -116,7 +118,7 @@ private:
     template <class Text, class End>
     void take(Text& into, End isEnd);
 
-    StreamWindow window;
+    detail::StreamWindow window;
     /// How much larger the token may become.
     std::size_t room = 0;
     /// No more tokens. Set while one is read, too, so that an exception ends them.
@@ -131,7 +133,7 @@ XMLParser::XMLParser(std::istream& in) : window(in) {
 
 Token XMLParser::next() {
     const bool ready = !std::exchange(ended, true) && window.attach();
-    PlainToken plain;
+    detail::PlainToken plain;
     const char* behind = ready ? plain.read(window.next, window.limit) : nullptr;
     // What may be too large is counted exactly, in pieces.
     if (behind && static_cast<std::size_t>(behind - window.next) > plainLimit) {
@@ -197,9 +199,9 @@ bool XMLParser::readMarkup(Token& token) {
 }
 
 bool XMLParser::readElement(Token& token) {
-    if (!atAny(CLASS_NAME_START))
+    if (!atAny(detail::CLASS_NAME_START))
         return false;
-    take(token.value, EndOfName());
+    take(token.value, detail::EndOfName());
     for (;;) {
         const bool spaced = skipSpace();
         if (expect('>')) {
@@ -216,22 +218,22 @@ bool XMLParser::readElement(Token& token) {
 }
 
 bool XMLParser::readAttribute(Token& token) {
-    if (!atAny(CLASS_NAME_START))
+    if (!atAny(detail::CLASS_NAME_START))
         return false;
     // Few tags come here, and most of those have few attributes.
     if (token.attrs.empty())
         token.attrs.reserve(4);
     charge<std::string>(attributeCost);
     token.attrs.emplace_back();
-    take(token.attrs.back().first, EndOfName());
+    take(token.attrs.back().first, detail::EndOfName());
     return readValue(token.attrs.back().second);
 }
 
 bool XMLParser::readEndTag(Token& token) {
     ++window.next;
-    if (!atAny(CLASS_NAME_START))
+    if (!atAny(detail::CLASS_NAME_START))
         return false;
-    take(token.value, EndOfName());
+    take(token.value, detail::EndOfName());
     skipSpace();
     token.type = Token::T_CLOSE;
     return expect('>');
@@ -241,7 +243,7 @@ bool XMLParser::readEndTag(Token& token) {
 bool XMLParser::readText(Token& token) {
     makeRoom(token.value, '<');
     do {
-        take(token.value, EndOfText());
+        take(token.value, detail::EndOfText());
         if (!at('&'))
             break;
         char decoded = 0;
@@ -263,12 +265,12 @@ bool XMLParser::skipComment() {
         return false;
     Discard nothing;
     for (;;) {
-        take(nothing, EndOfComment());
+        take(nothing, detail::EndOfComment());
         if (!expect('-'))
             return false;
         if (expect('-'))
             return expect('>');
-        if (!atAny(CLASS_COMMENT))
+        if (!atAny(detail::CLASS_COMMENT))
             return false;
         ++window.next;
     }
@@ -308,7 +310,7 @@ bool XMLParser::readValue(Text& value) {
     const char quote = *window.next++;
     makeRoom(value, quote);
     for (;;) {
-        take(value, EndOfValue{quote});
+        take(value, detail::EndOfValue{quote});
         if (expect(quote))
             return true;
         char decoded = 0;
@@ -324,12 +326,12 @@ bool XMLParser::readReference(char& decoded) {
     if (!expect('#'))
         return readEntity(decoded);
     if (!expect('x'))
-        return readNumber(CLASS_DIGIT, 10, decoded);
-    return readNumber(CLASS_HEX_DIGIT, 16, decoded);
+        return readNumber(detail::CLASS_DIGIT, 10, decoded);
+    return readNumber(detail::CLASS_HEX_DIGIT, 16, decoded);
 }
 
 /// A number that 32 bits cannot hold is the largest that they can.
-bool XMLParser::readNumber(CharClass digits, unsigned base, char& decoded) {
+bool XMLParser::readNumber(detail::CharClass digits, unsigned base, char& decoded) {
     if (!atAny(digits))
         return false;
     const std::uint32_t largest = std::numeric_limits<std::uint32_t>::max();
@@ -343,12 +345,12 @@ bool XMLParser::readNumber(CharClass digits, unsigned base, char& decoded) {
 }
 
 bool XMLParser::readEntity(char& decoded) {
-    if (!atAny(CLASS_NAME_START))
+    if (!atAny(detail::CLASS_NAME_START))
         return false;
     // One more than the longest name that means something.
     char name[5] = {};
     std::size_t size = 0;
-    for (; atAny(CLASS_NAME); ++window.next) {
+    for (; atAny(detail::CLASS_NAME); ++window.next) {
         if (size < sizeof name)
             name[size++] = *window.next;
     }
@@ -371,10 +373,10 @@ bool XMLParser::expect(const char* wanted) {
 
 /// Skips white space; false when there is none.
 bool XMLParser::skipSpace() {
-    if (!atAny(CLASS_SPACE))
+    if (!atAny(detail::CLASS_SPACE))
         return false;
     Discard nothing;
-    take(nothing, EndOfSpace());
+    take(nothing, detail::EndOfSpace());
     return true;
 }
 
@@ -442,7 +444,7 @@ std::size_t XMLTokenizer::maximumTokenSize() {
 }
 
 void XMLTokenizer::setMaximumTokenSize(std::size_t bytes) {
-    const std::size_t margin = PlainToken::mostAttributes * attributeCost;
+    const std::size_t margin = detail::PlainToken::mostAttributes * attributeCost;
     tokenLimit = bytes;
     plainLimit = bytes - std::min(bytes, margin);
 }

@@ -1,5 +1,7 @@
 #include "support/everything.h"
 
+#include "pells/core/factory.h"
+
 namespace pells_test {
 
 namespace {
