@@ -16,26 +16,6 @@ namespace pells {
 
 namespace {
 
-/// Reduces 8-bit channels to another width.
-template <class Entry>
-constexpr std::array<Entry, 256> reductionTable(unsigned bits) {
-    std::array<Entry, 256> table{};
-    for (unsigned channel = 0; channel < table.size(); ++channel)
-        table[channel] = static_cast<Entry>((channel << bits) >> 8);
-    return table;
-}
-
-// The entries are as wide as the packed forms they are shifted into.
-constexpr auto to2Bits = reductionTable<std::uint32_t>(2);
-constexpr auto to3Bits = reductionTable<std::uint32_t>(3);
-constexpr auto to4Bits = reductionTable<std::uint32_t>(4);
-constexpr auto to5Bits = reductionTable<std::uint32_t>(5);
-constexpr auto to10Bits = reductionTable<std::uint32_t>(10);
-
-std::uint32_t packed(unsigned alpha, unsigned first, unsigned second, unsigned third) {
-    return alpha << 24 | first << 16 | second << 8 | third;
-}
-
 std::size_t rgbaBytes(int pixelsWide, int pixelsHigh) {
     if (pixelsWide < 0 || pixelsHigh < 0)
         throw std::bad_array_new_length();
@@ -170,11 +150,6 @@ bool Image_base::dimensionsArePowerOfTwo() const {
     return (width & (width - 1)) == 0 && (height & (height - 1)) == 0;
 }
 
-std::size_t Image_base::offsetOf(int x, int y) const {
-    const std::size_t row = static_cast<std::size_t>(y) * static_cast<std::size_t>(width);
-    return (row + static_cast<std::size_t>(x)) * static_cast<std::size_t>(numComponents);
-}
-
 void Image_base::getColorComponents(int x, int y, unsigned char* r, unsigned char* g,
                                     unsigned char* b, unsigned char* a) const {
     const unsigned char* const pixel = &data[offsetOf(x, y)];
@@ -183,57 +158,6 @@ void Image_base::getColorComponents(int x, int y, unsigned char* r, unsigned cha
     *b = pixel[2];
     if (a)
         *a = pixel[3];
-}
-
-std::uint32_t Image_base::getColorAsABGR(int x, int y) const {
-    const unsigned char* const pixel = &data[offsetOf(x, y)];
-    if (format == FMT_RGB)
-        return packed(0xFF, pixel[2], pixel[1], pixel[0]);
-    return format == FMT_RGBA ? packed(pixel[3], pixel[2], pixel[1], pixel[0]) : 0;
-}
-
-std::uint32_t Image_base::getColorAsARGB(int x, int y) const {
-    const unsigned char* const pixel = &data[offsetOf(x, y)];
-    if (format == FMT_RGB)
-        return packed(0xFF, pixel[0], pixel[1], pixel[2]);
-    return format == FMT_RGBA ? packed(pixel[3], pixel[0], pixel[1], pixel[2]) : 0;
-}
-
-std::uint16_t Image_base::getColorAsA1R5G5B5(int x, int y) const {
-    const unsigned char* const pixel = &data[offsetOf(x, y)];
-    const bool opaque = format == FMT_RGB || pixel[3] > 127;
-    return static_cast<std::uint16_t>((opaque ? 0x8000U : 0U) | to5Bits[pixel[0]] << 10 |
-                                      to5Bits[pixel[1]] << 5 | to5Bits[pixel[2]]);
-}
-
-std::uint16_t Image_base::getColorAsA4R4G4B4(int x, int y) const {
-    const unsigned char* const pixel = &data[offsetOf(x, y)];
-    const unsigned alpha = format == FMT_RGB ? 0xFU : to4Bits[pixel[3]];
-    return static_cast<std::uint16_t>(alpha << 12 | to4Bits[pixel[0]] << 8 |
-                                      to4Bits[pixel[1]] << 4 | to4Bits[pixel[2]]);
-}
-
-std::uint16_t Image_base::getColorAsA8R3G3B2(int x, int y) const {
-    const unsigned char* const pixel = &data[offsetOf(x, y)];
-    const unsigned alpha = format == FMT_RGB ? 0xFFU : pixel[3];
-    return static_cast<std::uint16_t>(alpha << 8 | to3Bits[pixel[0]] << 5 | to3Bits[pixel[1]] << 2 |
-                                      to2Bits[pixel[2]]);
-}
-
-std::uint32_t Image_base::getColorAsA2B10G10R10(int x, int y) const {
-    const unsigned char* const pixel = &data[offsetOf(x, y)];
-    if (format != FMT_RGB && format != FMT_RGBA)
-        return 0;
-    const unsigned alpha = format == FMT_RGB ? 3U : to2Bits[pixel[3]];
-    return alpha << 30 | to10Bits[pixel[2]] << 20 | to10Bits[pixel[1]] << 10 | to10Bits[pixel[0]];
-}
-
-std::uint32_t Image_base::getColorAsABGR(double u, double v) const {
-    return getColorAsABGR(static_cast<int>(width * u), static_cast<int>(height * v));
-}
-
-std::uint32_t Image_base::getColorAsARGB(double u, double v) const {
-    return getColorAsARGB(static_cast<int>(width * u), static_cast<int>(height * v));
 }
 
 bool Image_base::setColorAsARGB(int x, int y, unsigned char c0, unsigned char c1, unsigned char c2,

@@ -167,10 +167,15 @@ protected:
 private:
     friend class TGAFileLoader;
 
-    std::size_t offsetOf(int x, int y) const;
+    std::size_t offsetOf(int x, int y) const {
+        const std::size_t row = static_cast<std::size_t>(y) * static_cast<std::size_t>(width);
+        return (row + static_cast<std::size_t>(x)) * static_cast<std::size_t>(numComponents);
+    }
 
     template <class Packed, class Pack>
-    void packRow(int y, Packed* row, Packed (Image_base::*getter)(int, int) const, Pack pack) const;
+    Packed packPixel(int x, int y, Pack pack) const;
+    template <class Packed, class Pack>
+    void packRow(int y, Packed* row, Pack pack) const;
 };
 
 }  // namespace pells

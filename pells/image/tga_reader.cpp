@@ -9,6 +9,7 @@
 #include <streambuf>
 #include <utility>
 
+#include "pells/core/detail/get_area.h"
 #include "pells/image/detail/channel_order.h"
 #include "pells/image/image_base.h"
 #include "pells/image/image_loaders.h"
@@ -43,31 +44,21 @@ bool readAll(std::istream& in, unsigned char* to, std::size_t size) {
     return in.gcount() == wanted;
 }
 
-/// The bytes that a stream buffer has at hand, for taking them without a copy.
-class GetArea : private std::streambuf {
-public:
-    explicit GetArea(std::istream& in) : buffer(*in.rdbuf()) {}
-
-    /// The next so many bytes, which count as read, or null when fewer are at hand. They stay until
-    /// the stream is used again.
-    const unsigned char* take(std::size_t size) {
-        // Named through this class, the protected operations may be called on any buffer.
-        const char* const next = (buffer.*&GetArea::gptr)();
-        if (static_cast<std::size_t>((buffer.*&GetArea::egptr)() - next) < size)
-            return nullptr;
-        (buffer.*&GetArea::gbump)(static_cast<int>(size));
-        return reinterpret_cast<const unsigned char*>(next);
-    }
-
-private:
-    std::streambuf& buffer;
-};
+/// The next so many bytes, which count as read, or null when the buffer has fewer at hand. They
+/// stay until the stream is used again.
+const unsigned char* takeAtHand(std::streambuf& buffer, std::size_t size) {
+    using detail::GetArea;
+    const char* const next = GetArea::next(buffer);
+    if (static_cast<std::size_t>(GetArea::limit(buffer) - next) < size)
+        return nullptr;
+    GetArea::moveTo(buffer, next + size);
+    return reinterpret_cast<const unsigned char*>(next);
+}
 
 /// The next so many bytes, where the stream has them or else in the scratch memory; null when the
 /// stream ends before.
 const unsigned char* nextBytes(std::istream& in, unsigned char* scratch, std::size_t size) {
-    const unsigned char* const atHand = in.good() ? GetArea(in).take(size) : nullptr;
-    if (atHand)
+    if (const unsigned char* const atHand = in.good() ? takeAtHand(*in.rdbuf(), size) : nullptr)
         return atHand;
     return readAll(in, scratch, size) ? scratch : nullptr;
 }
@@ -88,9 +79,9 @@ bool surelyHolds(std::istream& in, std::uint64_t size) {
     return end != lost && end - here >= wanted;
 }
 
-/// The rows of a picture, first shown row first, in memory that grows as rows are filed.
+/// The rows of a picture, first shown row first, in memory that grows as rows arrive.
 ///
-/// Rows that come bottom first are filed from the end of the memory towards its start, so that
+/// Rows that come bottom first are stored from the end of the memory towards its start, so that
 /// growing never changes their order.
 class PixelRows {
 public:
@@ -102,7 +93,7 @@ public:
         return needed <= capacity || grow(std::min(rows, std::max(needed, 2 * capacity)));
     }
 
-    /// Makes room for exactly so many rows and keeps those that are filed.
+    /// Makes room for exactly so many rows and keeps those that are stored.
     bool grow(std::size_t newCapacity) {
         Bytes larger = allocate(std::uint64_t(newCapacity) * rowBytes);
         if (!larger)
@@ -116,8 +107,9 @@ public:
         return true;
     }
 
-    /// Files a piece of the file's pixels that begins so many bytes after the first pixel.
-    void file(const unsigned char* piece, std::size_t size, std::uint64_t at, int components) {
+    /// Stores a piece of the file's pixels that begins so many bytes after the first pixel, in
+    /// red-green-blue order.
+    void store(const unsigned char* piece, std::size_t size, std::uint64_t at, int components) {
         std::size_t row = static_cast<std::size_t>(at / rowBytes);
         std::size_t column = static_cast<std::size_t>(at % rowBytes);
         while (size != 0) {
@@ -266,7 +258,7 @@ std::unique_ptr<unsigned char[]> TGAFileLoader::_loadData(std::istream& in, int 
         }
         if (!pixels.reserve(static_cast<std::size_t>((at + count + rowBytes - 1) / rowBytes)))
             return nullptr;
-        pixels.file(piece, count, at, components);
+        pixels.store(piece, count, at, components);
         at += count;
     }
     return pixels.release();

@@ -120,17 +120,20 @@ inline std::uint32_t Performance::getTimestamp() {
     return static_cast<std::uint32_t>(ticks / frequency * 1000000u + fraction);
 }
 
-Performance::Performance(const std::string& label, PerformanceCategory* chargedTo)
-    : category(chargedTo) {
+template <class Label>
+inline void Performance::begin(const Label& label) {
     if (enabled)
         logEntry(label);
     categoryTotalAtStart = PerformanceCategory::push(category, startTime);
 }
 
+Performance::Performance(const std::string& label, PerformanceCategory* chargedTo)
+    : category(chargedTo) {
+    begin(label);
+}
+
 Performance::Performance(const char* label, PerformanceCategory* chargedTo) : category(chargedTo) {
-    if (enabled)
-        logEntry(label);
-    categoryTotalAtStart = PerformanceCategory::push(category, startTime);
+    begin(label);
 }
 
 Performance::~Performance() {
@@ -148,10 +151,6 @@ Performance::~Performance() {
 void Performance::logEntry(const std::string& label) {
     name = label;
     writeLine(category->detailTag.getTag(), "Entering " + name);
-}
-
-void Performance::logEntry(const char* label) {
-    logEntry(std::string(label));
 }
 
 void Performance::logExit(std::uint32_t inclusive, std::uint32_t exclusive) const {

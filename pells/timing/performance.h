@@ -78,8 +78,9 @@ public:
 
 private:
     static std::uint32_t getTimestamp();
+    template <class Label>
+    void begin(const Label& label);
     void logEntry(const std::string& label);
-    void logEntry(const char* label);
     void logExit(std::uint32_t inclusive, std::uint32_t exclusive) const;
 
     // Empty while the tag is off.

@@ -1,3 +1,2 @@
-pells_sources(timing
-    HEADERS performance.h timer.h timestamp.h
-    SOURCES performance.cpp timer.cpp timestamp.cpp)
+pells_sources(timing HEADERS performance.h timer.h timestamp.h SOURCES
+                  performance.cpp timer.cpp timestamp.cpp)

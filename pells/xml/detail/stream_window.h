@@ -5,6 +5,8 @@
 #include <limits>
 #include <streambuf>
 
+#include "pells/core/detail/get_area.h"
+
 namespace pells::detail {
 
 /// The characters of an input stream, seen through the get area of its buffer: `next` to `limit`
@@ -64,14 +66,6 @@ public:
     const char* limit = nullptr;
 
 private:
-    /// The get area of any stream buffer. A derived class may name the protected members, and a
-    /// pointer to a member of the base fits every buffer.
-    struct GetArea : std::streambuf {
-        static char* next(const std::streambuf& buffer) { return (buffer.*&GetArea::gptr)(); }
-        static char* limit(const std::streambuf& buffer) { return (buffer.*&GetArea::egptr)(); }
-        static void moveTo(std::streambuf& buffer, const char* position);
-    };
-
     bool isSingle() const { return limit == &single + 1; }
     bool refuse();
     void consume();
@@ -92,12 +86,6 @@ private:
 };
 
 // Every token goes through these.
-
-inline void StreamWindow::GetArea::moveTo(std::streambuf& buffer, const char* position) {
-    // Not gbump(), whose int does not reach across large areas.
-    char* const start = (buffer.*&GetArea::eback)();
-    (buffer.*&GetArea::setg)(start, start + (position - start), limit(buffer));
-}
 
 inline bool StreamWindow::attach() {
     if (!state.good())
