@@ -1,5 +1,6 @@
 #include "bench/serial/tables.h"
 
+#include "pells/core/factory.h"
 #include "pells/serial/member_field.h"
 #include "pells/serial/object_handlers.h"
 
