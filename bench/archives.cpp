@@ -128,7 +128,7 @@ private:
     Content nothing{std::string()};
 };
 
-/// A TGA file of 24 bits a pixel.
+/// A TGA file of 24 bits per pixel.
 std::string tgaFile(int side) {
     unsigned char header[18] = {0, 0, 2};
     pells::Image_base::setInt(header + 12, side);

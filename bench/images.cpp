@@ -23,7 +23,7 @@ using pells::Image_base;
 const std::size_t headerSize = 18;
 const int topFirst = 0x20;
 
-/// A TGA file of that many bits a pixel whose rows are equal, but for a first byte.
+/// A TGA file of that many bits per pixel whose rows are equal, but for a first byte.
 std::string tgaFile(int side, int bits, int flags) {
     std::string file(headerSize, '\0');
     auto* const header = reinterpret_cast<unsigned char*>(&file[0]);

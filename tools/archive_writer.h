@@ -35,7 +35,7 @@ namespace pells {
 /// reached. It is not empty, and no two members share one.
 ///
 /// The file: "PELLS ", the offset of the directory in eight hexadecimal digits, "v1.0", CR, LF,
-/// 0x1A; then the members, each a zlib stream (RFC 1950); then one line a member,
+/// 0x1A; then the members, each a zlib stream (RFC 1950); then one line per member,
 /// "O<offset> L<stored length> |<name>", CR, LF. Numbers have 32 bits.
 class ArchiveWriter {
 public:

@@ -38,7 +38,7 @@ void list(const std::string& file) {
 void addList(CLI::App& app) {
     const auto file = std::make_shared<std::string>();
     CLI::App* const command =
-        app.add_subcommand("list", "Show the members of an archive, one a line");
+        app.add_subcommand("list", "Show the members of an archive, one per line");
     command->add_option("FILE", *file, "The archive")->required()->type_name("");
     command->footer("Each line has the stored (compressed) size in bytes and the name.");
     command->callback([file] { list(*file); });

@@ -23,7 +23,7 @@ struct Page {
 /// Pages of at most so many cells; one page where there are none.
 std::vector<Page> paginate(std::size_t cells, std::size_t mostCells);
 
-/// Checks that an output file is none of the files that are read, be it by another name.
+/// Checks that an output file is none of the files that are read, under any name.
 ///
 /// \throws pells::FileError
 void protectInput(const std::string& output, const std::string& input);

@@ -15,7 +15,7 @@ public:
     PngFile(const PngFile&) = delete;
     PngFile& operator=(const PngFile&) = delete;
 
-    /// Writes the next row, 3 bytes a pixel. \throws pells::FileError
+    /// Writes the next row, 3 bytes per pixel. \throws pells::FileError
     void writeRow(const unsigned char* row);
 
     /// Completes the picture, of which every row was written, and gives it its name.

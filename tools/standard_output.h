@@ -6,7 +6,7 @@
 
 namespace pells_tool {
 
-/// Whoever reads standard output has gone away: the end of the work, and nothing to complain of.
+/// The reader of standard output has gone away, which ends the work and is no failure.
 class ReaderGone : public std::exception {};
 
 /// Writes to standard output. Its disk may be full, or its reader gone: each function throws

@@ -91,8 +91,8 @@ public:
     ///     load(second->getStream());
     boost::intrusive_ptr<baseiStreamContainer> getFileStream(const std::string& name, bool flag);
 
-    /// Whether an archive has a member of that name or the root anything but a folder, be it a pipe
-    /// that getFileStream() refuses. Aliases do not count.
+    /// Whether an archive has a member of that name or the root anything but a folder, including a
+    /// pipe, which getFileStream() refuses. Aliases do not count.
     bool isFile(const std::string& name) const;
 
     /// Whether an archive has members below that name or the root such a folder. Aliases do not
@@ -157,6 +157,7 @@ public:
 
 protected:
     /// \param sourceName outlives the opener; may be a member of the derived class.
+    /// \param sourceTime see getWriteTime().
     Opener(const std::string& sourceName, std::int64_t sourceTime);
 
 private:
@@ -167,6 +168,8 @@ private:
 /// Opens a plain file. One that cannot be opened leaves a line under "error".
 class PELLS_API AssetManager::FileOpener : public AssetManager::Opener {
 public:
+    /// \param filePath   in the file system, not an asset's name.
+    /// \param sourceTime see getWriteTime().
     FileOpener(std::string filePath, std::int64_t sourceTime);
     ~FileOpener() override;
 
@@ -179,11 +182,14 @@ private:
 /// Selects a member of an archive, which outlives the opener and its containers.
 class PELLS_API AssetManager::MemberOpener : public AssetManager::Opener {
 public:
-    /// \param entry of the archive's directory.
+    /// \param entry       of the archive's directory, where it stays.
+    /// \param sourceTime  see getWriteTime().
+    /// \param openArchive not owned; outlives the opener.
     MemberOpener(const pellistream::Directory::value_type& entry, std::int64_t sourceTime,
                  pellistream* openArchive);
     ~MemberOpener() override;
 
+    /// The archive that holds the member.
     const pellistream* getArchive() const { return archive; }
 
     boost::intrusive_ptr<baseiStreamContainer> open(bool flag) override;
@@ -195,6 +201,7 @@ private:
 
 /// The answer of AssetManager::resolve().
 struct PELLS_API AssetManager::Resolution {
+    /// What kind of place serves the name.
     enum Source {
         NOWHERE,         ///< getFileStream() would return null
         ARCHIVE_MEMBER,  ///< a member of an archive
@@ -202,6 +209,7 @@ struct PELLS_API AssetManager::Resolution {
         FILE_SYSTEM  ///< a plain file that no archive holds
     };
 
+    /// Where the asset lies.
     Source source = NOWHERE;
     /// The archive or the plain file; empty for NOWHERE.
     std::string path;

@@ -21,7 +21,8 @@
 ///
 ///     "PELLS " OFFSET "v1.0" CR LF 0x1A    OFFSET of the directory from the start of the file
 ///     ... data of the members, anywhere and in any order ...
-///     "O" OFFSET " L" LENGTH " |" NAME CR LF    one line a member, to the end of the file or 0x1A
+///     "O" OFFSET " L" LENGTH " |" NAME CR LF    one line per member, to the end of the file or
+///     0x1A
 ///
 /// Offsets and lengths are hexadecimal and below 2^32; leading zeros are fine, so that a writer can
 /// reserve a field of fixed width in the header. In the directory nothing but digits makes a
@@ -39,9 +40,10 @@ public:
     /// Where the stored (compressed) bytes of a member lie in the archive. Nothing says that the
     /// file reaches that far.
     struct Entry {
-        std::streamoff offset;
-        std::uint32_t length;
+        std::streamoff offset;  ///< in bytes, from the start of the file
+        std::uint32_t length;   ///< in bytes
     };
+    /// The members by name, in ascending byte order.
     typedef std::map<std::string, Entry> Directory;
 
     /// Picks the name from an entry of the directory.
@@ -54,7 +56,8 @@ public:
     /// Yields member names.
     typedef boost::transform_iterator<NameOf, typename Directory::const_iterator> const_iterator;
 
-    /// \param owns true hands the stream over: it is deleted with this object.
+    /// \param archiveStream not null; outlives this object unless it is handed over.
+    /// \param owns          true hands the stream over: it is deleted with this object.
     basic_pellbuf(Stream* archiveStream, bool owns);
     basic_pellbuf(const basic_pellbuf&) = delete;
     basic_pellbuf& operator=(const basic_pellbuf&) = delete;
@@ -64,16 +67,17 @@ public:
     const_iterator begin() const;
     const_iterator end() const;
 
+    /// Where each member lies in the file, by name.
     const Directory& getDirectory() const;
 
     /// The name that selected the member as it was asked for, or "" without one.
     const std::string& getMemberName() const;
 
 protected:
-    Stream* stream;
-    Stream* ownedStream;
-    Directory directory;
-    std::string memberName;
+    Stream* stream;          ///< the archive
+    Stream* ownedStream;     ///< the same if it is this object's, else null
+    Directory directory;     ///< filled by the derived class
+    std::string memberName;  ///< see getMemberName()
 };
 
 extern template class PELLS_API basic_pellbuf<std::istream>;
@@ -88,6 +92,7 @@ class PELLS_TEMPLATE_API basic_pellibuf : public simple_istreambuf<C, Traits>,
 public:
     /// A file is no archive that can be read, or the file ends before a member's data does.
     struct PELLS_API BadPellFile : public std::runtime_error {
+        /// \param message says what is wrong with the file, without its name.
         explicit BadPellFile(const std::string& message);
         ~BadPellFile() override;
     };
@@ -119,7 +124,8 @@ public:
 protected:
     /// Reads members of an archive whose directory is known.
     ///
-    /// \param file of the library's own class for archives.
+    /// \param file  of the library's own class for archives; not null.
+    /// \param known what reading the file's directory would give.
     basic_pellibuf(std::unique_ptr<std::istream> file, Directory&& known);
 
     /// Inflates straight into the reader's memory where that is larger than the own buffer.
@@ -179,6 +185,7 @@ template <class C = char, class Traits = std::char_traits<C>>
 class PELLS_TEMPLATE_API basic_pellistream
     : public simple_istream<C, Traits, basic_pellibuf<C, Traits>> {
 public:
+    /// The parts of the buffer, for short.
     typedef basic_pellibuf<C, Traits> Buffer;
     typedef typename Buffer::BadPellFile BadPellFile;
     typedef typename Buffer::Directory Directory;
@@ -226,6 +233,7 @@ protected:
 
 extern template class PELLS_API basic_pellistream<char>;
 
+/// The instances for bytes.
 typedef basic_pellibuf<char> pellibuf;
 typedef basic_pellistream<char> pellistream;
 

@@ -9,7 +9,7 @@
 
 namespace pells {
 
-/// Holds, or points at, one input stream; whoever reads keeps the container alive meanwhile.
+/// Holds, or points at, one input stream. Keep the container alive while reading.
 class PELLS_API baseiStreamContainer : public smart_base {
 public:
     ~baseiStreamContainer() override;
@@ -42,6 +42,7 @@ private:
 /// A stream that belongs to somebody else and outlives the container.
 class PELLS_API iExistingStreamContainer : public baseiStreamContainer {
 public:
+    /// \param existingStream not owned; outlives the container.
     explicit iExistingStreamContainer(std::istream& existingStream);
     ~iExistingStreamContainer() override;
 

@@ -16,6 +16,7 @@ namespace pells {
 struct PELLS_API ZlibWrapper : public z_stream_s {
     /// A zlib operation failed; what() is the text of getMessage().
     struct PELLS_API ZlibError : public std::runtime_error {
+        /// \param message what check() logs and what() says.
         explicit ZlibError(const std::string& message);
         ~ZlibError() override;
     };
@@ -27,10 +28,11 @@ struct PELLS_API ZlibWrapper : public z_stream_s {
     ZlibWrapper& operator=(const ZlibWrapper&) = default;
     virtual ~ZlibWrapper() noexcept(false);
 
-    /// Returns when `result` is one of the two accepted codes; who accepts only one passes it
-    /// twice.
+    /// Returns when the result of an operation is one that the caller accepts.
     ///
-    /// \param what the operation, for the message.
+    /// \param what     the operation, for the message.
+    /// \param result   what zlib returned.
+    /// \param ok1, ok2 the accepted results; the same one twice where there is only one.
     /// \throws ZlibError for any other result, after logging its text under "error". The stream
     ///         stays as zlib left it.
     void check(const std::string& what, int result, int ok1, int ok2) const;
@@ -47,9 +49,11 @@ struct PELLS_API ZlibWrapper : public z_stream_s {
 /// inflateReset() on the object. With 15 window bits the input is in zlib's own format (RFC 1950);
 /// gzip files and bare deflate data are refused as Z_DATA_ERROR.
 struct PELLS_API ZlibInflater : public ZlibWrapper {
-    /// \param input     the first input, or null; it is not copied.
-    /// \param available bytes of the first input.
-    /// \throws ZlibError when zlib refuses, with Z_MEM_ERROR for instance.
+    /// \param input      the first input, or null; it is not copied.
+    /// \param available  bytes of the first input.
+    /// \param windowBits as for zlib's inflateInit2(): 8 to 15, the logarithm of the largest
+    /// window. \param allocate, release, allocatorData as for ZlibWrapper. \throws ZlibError when
+    /// zlib refuses, with Z_MEM_ERROR for instance.
     ZlibInflater(Bytef* input, uInt available, int windowBits, alloc_func allocate,
                  free_func release, voidpf allocatorData);
     ZlibInflater(const ZlibInflater&) = delete;

@@ -18,6 +18,7 @@ extern template class PELLS_API NamedObject<FactoryByTypeID, FactoryByTypeID*>;
 /// The side of a factory that is found by the name of the class it makes.
 class PELLS_API FactoryByName : public NamedObject<FactoryByName, FactoryByName*> {
 public:
+    /// \param className under which the class that is made is looked up.
     explicit FactoryByName(const std::string& className);
     ~FactoryByName() override;
 
@@ -32,6 +33,7 @@ private:
 /// The side of a factory that is found by typeid(T).name() of the class it makes.
 class PELLS_API FactoryByTypeID : public NamedObject<FactoryByTypeID, FactoryByTypeID*> {
 public:
+    /// \param typeName typeid(T).name() of the class that is made.
     explicit FactoryByTypeID(const std::string& typeName);
     ~FactoryByTypeID() override;
 
@@ -62,6 +64,7 @@ public:
         FactoryByName::productBase = FactoryByTypeID::productBase = nullptr;
     }
 
+    /// What makes the objects of this factory.
     virtual Creator getCreator() const = 0;
 
     /// The creator registered under a class name; empty when there is none, or when that factory
@@ -110,6 +113,7 @@ private:
 template <class Base, class Concrete>
 class PELLS_TEMPLATE_API Factory : public AbstractFactory<Base> {
 public:
+    /// \param className under which createByName() makes a Concrete.
     explicit Factory(const std::string& className)
         : AbstractFactory<Base>(className, typeid(Concrete).name()),
           creator([]() -> Base* { return new Concrete; }) {}
@@ -126,6 +130,7 @@ class Serializable;
 template <class T>
 class PELLS_TEMPLATE_API SerializableFactory : public Factory<Serializable, T> {
 public:
+    /// \param className what documents call the class in attributes "class".
     explicit SerializableFactory(const std::string& className)
         : Factory<Serializable, T>(className) {}
 };

@@ -41,6 +41,7 @@ public:
     /// forgotten.
     virtual ~NamedObject();
 
+    /// The name that the object was made with, whether or not it is the registered one.
     const std::string& getName() const;
 
     /// The object of a name. \throws NotFound when there is none.
@@ -69,6 +70,7 @@ private:
     };
 
 public:
+    /// Yields pointers, of type P.
     typedef boost::transform_iterator<ToPointer, typename Registry::const_iterator> const_iterator;
 
     /// Iterates over the registered objects in name order; yields P.
@@ -105,6 +107,7 @@ public:
     static T& find(const std::string& name);
 
 protected:
+    /// Registers the object, as NamedObject's constructor does.
     explicit DemandNamedObject(const std::string& objectName);
 };
 

@@ -12,6 +12,7 @@ namespace pells {
 template <class T>
 class NoDestructor {
 public:
+    /// Constructs the object from the arguments.
     template <class... Args>
     explicit NoDestructor(Args&&... args) {
         ::new (static_cast<void*>(storage)) T(std::forward<Args>(args)...);
@@ -19,6 +20,7 @@ public:
     NoDestructor(const NoDestructor&) = delete;
     NoDestructor& operator=(const NoDestructor&) = delete;
 
+    /// The object.
     T& operator*() { return *get(); }
     const T& operator*() const { return *get(); }
     T* operator->() { return get(); }

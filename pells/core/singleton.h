@@ -24,6 +24,7 @@ protected:
 template <class T>
 class SingletonFactory {
 public:
+    /// A new T, which belongs to the caller.
     static T* create() { return new T; }
 };
 
@@ -44,6 +45,7 @@ public:
     /// The one object, created if there is none.
     static T& instance();
 
+    /// Deletes the object, whatever it is derived from beside this class.
     void deleteSelf() override;
 
     /// The one object, or null.

@@ -9,7 +9,7 @@ namespace pells {
 /// Polymorphic base of the objects that the library holds through boost::intrusive_ptr.
 ///
 /// An object starts with no references and deletes itself when the last intrusive pointer lets go;
-/// one that never meets an intrusive pointer belongs to whoever made it. The count is a plain
+/// one that is never held by an intrusive pointer belongs to its creator. The count is a plain
 /// integer: references to one object are taken and dropped on one thread.
 class PELLS_API smart_base {
 public:
@@ -37,6 +37,7 @@ private:
     std::int32_t count = 0;
 };
 
+/// What boost::intrusive_ptr calls to take and to drop a reference.
 inline void intrusive_ptr_add_ref(smart_base* object) {
     object->addRef();
 }
@@ -50,6 +51,7 @@ inline void intrusive_ptr_release(smart_base* object) {
 /// count of its own.
 class KeptAlive {
 public:
+    /// \param object outlives this one, if it is not deleted by it.
     explicit KeptAlive(smart_base& object) : kept(object), isCounted(object.count > 0) {
         if (isCounted)
             ++kept.count;

@@ -9,6 +9,7 @@ namespace pells {
 
 /// Splits a text at runs of separator characters.
 ///
+/// \param text       may hold any bytes.
 /// \param separators each character is one separator; empty: the text is one piece.
 /// \param out        emptied, then filled with the pieces in order; no piece is empty.
 /// \return the number of pieces.

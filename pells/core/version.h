@@ -12,10 +12,12 @@ namespace pells {
 /// A version number of two parts, ordered by the first and then by the second.
 class PELLS_API Version {
 public:
+    /// Major and minor number.
     typedef std::pair<std::int16_t, std::int16_t> Pair;
 
     /// 0.0
     Version() = default;
+    /// Any two numbers, negative ones too.
     Version(std::int16_t majorNumber, std::int16_t minorNumber);
     Version(const Pair& numbers);  // NOLINT(google-explicit-constructor): a pair is the value
 
@@ -25,6 +27,7 @@ public:
     ///         "1.5.3".
     explicit Version(const std::string& text);
 
+    /// The two numbers, one by one and together.
     std::int16_t getMajor() const { return numbers.first; }
     std::int16_t getMinor() const { return numbers.second; }
     const Pair& getPair() const { return numbers; }
@@ -36,6 +39,7 @@ private:
     Pair numbers{0, 0};
 };
 
+/// Versions compare by the major number first.
 inline bool operator<(const Version& a, const Version& b) {
     return a.getPair() < b.getPair();
 }
@@ -55,6 +59,7 @@ inline bool operator>(const Version& a, const Version& b) {
     return a.getPair() > b.getPair();
 }
 
+/// Writes str().
 PELLS_API std::ostream& operator<<(std::ostream& out, const Version& version);
 
 }  // namespace pells

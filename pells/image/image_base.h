@@ -46,12 +46,14 @@ public:
     /// that colorize() goes on with it when the image is filled again.
     void clearImage();
 
+    /// In pixels; 0 for an image without a picture.
     int getWidth() const { return width; }
     int getHeight() const { return height; }
 
     /// Bytes per pixel: 3 or 4, and 0 for an image without a picture.
     int getNumComponents() const { return numComponents; }
 
+    /// The layout of the pixels; means nothing for an image without a picture.
     ImageFormat getFormat() { return format; }
 
     /// The pixels, getWidth() x getHeight() x getNumComponents() bytes, or null. They stay the
@@ -61,10 +63,11 @@ public:
     /// The name the image was made with; reading a picture empties it.
     std::string getFileName() const { return fileName; }
 
-    /// Whether there are pixels, be they those of the substitute.
+    /// Whether there are pixels, including those of the substitute.
     bool isValid() const { return data != nullptr; }
 
-    /// Whether a load failed and the pixels are those of the substitute.
+    /// Whether loadTarga() or loadPellFileImage() has failed on this image. The pixels were those
+    /// of the substitute then; a good load that follows replaces them, and this stays true.
     bool isBogusImage() const { return bogus; }
 
     /// Whether the picture came from an 8-bit grey file, so that colorize() works.
@@ -73,33 +76,38 @@ public:
     /// Whether both sizes are powers of two or 0.
     bool dimensionsArePowerOfTwo() const;
 
-    /// Copies the channels of a pixel.
+    /// Copies the channels of a pixel, each 0 to 255.
     ///
+    /// \param x, y 0 <= x < getWidth() from the left, 0 <= y < getHeight() from the top.
+    /// \param r, g, b where red, green and blue go; not null.
     /// \param a null, or where the alpha goes; only for images of four bytes per pixel.
     void getColorComponents(int x, int y, unsigned char* r, unsigned char* g, unsigned char* b,
                             unsigned char* a) const;
 
-    // The pixel in packed form, its first letter in the highest bits. Wide channels lose their low
-    // bits; a 10-bit channel is four times the 8-bit one, at most 1020. Pixels without alpha are
-    // opaque. In a derived class' own format, neither RGB nor RGBA, the 32-bit forms are 0 and the
-    // 16-bit forms take the fourth byte for alpha.
+    /// The pixel in packed form, its first letter in the highest bits: A1R5G5B5 has one bit of
+    /// alpha, set above 127, over five each of red, green and blue. Narrow channels keep the high
+    /// bits; a channel of 10 bits is four times the 8-bit one, at most 1020. Pixels without alpha
+    /// are opaque. In a derived class' own format, neither RGB nor RGBA, the 32-bit forms are 0 and
+    /// the 16-bit forms take the fourth byte for alpha.
+    ///
+    /// \param x, y 0 <= x < getWidth() from the left, 0 <= y < getHeight() from the top.
     std::uint32_t getColorAsABGR(int x, int y) const;
     std::uint32_t getColorAsARGB(int x, int y) const;
-    std::uint16_t getColorAsA1R5G5B5(int x, int y) const;  ///< alpha set above 127
+    std::uint16_t getColorAsA1R5G5B5(int x, int y) const;
     std::uint16_t getColorAsA4R4G4B4(int x, int y) const;
     std::uint16_t getColorAsA8R3G3B2(int x, int y) const;
     std::uint32_t getColorAsA2B10G10R10(int x, int y) const;
 
-    // The pixel that a texture coordinate lies in, 0 <= u < 1 and 0 <= v < 1, v downwards; neither
-    // filtered nor wrapped.
+    /// The pixel that a texture coordinate lies in, 0 <= u < 1 and 0 <= v < 1, v downwards; neither
+    /// filtered nor wrapped.
     std::uint32_t getColorAsABGR(double u, double v) const;
     std::uint32_t getColorAsARGB(double u, double v) const;
 
-    // A whole row of pixels, getWidth() values, each the same as the getter above gives for it, but
-    // several times faster than asking for each.
-    //
-    // \param y   as above, 0 <= y < getHeight().
-    // \param row where the values go, from the left.
+    /// A whole row of pixels, each the same as the getter above gives for it, but several times
+    /// faster than asking for each.
+    ///
+    /// \param y   0 <= y < getHeight(), from the top.
+    /// \param row where the getWidth() values go, from the left; not null.
     void getRowAsABGR(int y, std::uint32_t* row) const;
     void getRowAsARGB(int y, std::uint32_t* row) const;
     void getRowAsA1R5G5B5(int y, std::uint16_t* row) const;
@@ -107,8 +115,8 @@ public:
     void getRowAsA8R3G3B2(int y, std::uint16_t* row) const;
     void getRowAsA2B10G10R10(int y, std::uint32_t* row) const;
 
-    /// Sets a pixel to red, green, blue and, in an image that has it, alpha: in this order, the one
-    /// the bytes have in memory.
+    /// Sets a pixel, at a position as above, to red, green, blue and, in an image that has it,
+    /// alpha: in this order, the one the bytes have in memory.
     ///
     /// \return false when there is no such pixel.
     bool setColorAsARGB(int x, int y, unsigned char c0, unsigned char c1, unsigned char c2,
@@ -125,8 +133,8 @@ public:
     void colorize(unsigned char r1, unsigned char g1, unsigned char b1, unsigned char r2,
                   unsigned char g2, unsigned char b2);
 
-    // Little-endian numbers in byte buffers, as file headers have them. Setters drop the bits that
-    // do not fit.
+    /// Little-endian numbers of one, two and four bytes, as file headers have them. Setters drop
+    /// the bits that do not fit. The bytes need no alignment.
     static int getCharValue(const unsigned char* p) { return p[0]; }
     static void setCharValue(unsigned char* p, int v);
     static int getInt(const unsigned char* p) { return p[0] + 256 * p[1]; }  ///< 0 to 65535
@@ -149,19 +157,19 @@ protected:
     /// member "tga", or makes it the substitute. Throws nothing, as loadTarga().
     void loadPellFileImage(const std::string& name);
 
-    int width = 0;
-    int height = 0;
-    int numComponents = 0;
-    bool grayscale = false;
-    ImageFormat format = FMT_RGB;
-    std::unique_ptr<unsigned char[]> data;
-    std::unique_ptr<unsigned char[]> grayData;  ///< one level a pixel, rows as in data
-    std::string fileName;
-    bool loadedFromPell = false;
-    bool bogus = false;
+    int width = 0;                              ///< see getWidth()
+    int height = 0;                             ///< see getHeight()
+    int numComponents = 0;                      ///< see getNumComponents()
+    bool grayscale = false;                     ///< see isGrayscale()
+    ImageFormat format = FMT_RGB;               ///< see getFormat()
+    std::unique_ptr<unsigned char[]> data;      ///< see getData()
+    std::unique_ptr<unsigned char[]> grayData;  ///< one level per pixel, rows as in data
+    std::string fileName;                       ///< see getFileName()
+    bool loadedFromPell = false;                ///< the image was made with the name of an archive
+    bool bogus = false;                         ///< see isBogusImage()
     std::string extension;  ///< of the name the image was made with, from its last "." on
 
-    /// Levels in grayData; whoever sets one sets the other.
+    /// Levels in grayData; both are set together.
     std::size_t graySize = 0;
 
 private:

@@ -34,8 +34,8 @@ public:
 
     boost::intrusive_ptr<Field> getField(const std::string& entryName) override;
 
-    std::vector<ImageLoaderBase*> getters;
-    std::string name;
+    std::vector<ImageLoaderBase*> getters;  ///< not owned
+    std::string name;                       ///< what applications ask for
 };
 
 /// Fills images by name, from the first of the name's loaders that can.
@@ -56,10 +56,11 @@ public:
 ///
 /// The classes are those with a SerializableFactory that derive from ImageLoaderBase; loaders of
 /// the application count, too. An entry replaces an earlier one of the same name; an entry without
-/// loaders counts as none. The manager owns every loader and releases it at its end.
+/// loaders counts as none. The manager owns the loaders that the file makes and releases them at
+/// its end; loaders that the application brings in by calling load() later are not released.
 ///
 /// Without the file, or with one of another root element, the manager is empty, after a line under
-/// "error". One thread only.
+/// "error"; a malformed file, of which `<imagedefs/>` is one, throws. One thread only.
 class PELLS_API ImageFallbackManager
     : public Serializable,
       public Singleton<ImageFallbackManager, SingletonFactory<ImageFallbackManager>> {
@@ -78,6 +79,8 @@ public:
 
     /// Fills an image from one of the loaders of a name.
     ///
+    /// \param image not null.
+    /// \param name  compared byte for byte.
     /// \param index 0 for the loader that is tried first.
     /// \return a Result. A loader that fails may leave the image cleared.
     /// \throws what the loader throws, see TGAFileLoader::uploadImage().

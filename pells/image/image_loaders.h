@@ -27,7 +27,8 @@ public:
 
     /// Fills an image with the picture.
     ///
-    /// \return false when that fails, after lines in the log; the image may have been cleared.
+    /// \return false when that fails; the image may have been cleared. Most failures leave lines in
+    ///         the log; a loader without a name and a null image do not.
     virtual bool uploadImage(Image_base* image) = 0;
 };
 
@@ -40,6 +41,7 @@ public:
     explicit FileLoader(const char* name);
     ~FileLoader() override;
 
+    /// The name, with what appendPathInfo() put before it.
     const std::string& getFileName() const { return fileName; }
 
     /// Puts the path right before the file name; it ends in its own separator.
@@ -48,7 +50,7 @@ public:
     bool uploadImage(Image_base* image) override;
 
 protected:
-    std::string fileName;
+    std::string fileName;  ///< see getFileName()
 };
 
 /// Fills images with TGA files that the AssetManager finds by name.
@@ -89,6 +91,8 @@ public:
     /// The largest picture that is read, in pixels: 2^28, or 16384 x 16384, unless it was set. A
     /// larger one counts as one that memory cannot be had for.
     static std::uint64_t maximumPixels();
+
+    /// Takes effect with the next picture.
     static void setMaximumPixels(std::uint64_t pixels);
 
 private:
@@ -106,6 +110,8 @@ private:
 class PELLS_API PellTGAFileLoader : public TGAFileLoader {
 public:
     PellTGAFileLoader() = default;
+
+    /// \param name path of an archive in the file system; null and "" make a loader that fails.
     explicit PellTGAFileLoader(const char* name);
     ~PellTGAFileLoader() override;
 

@@ -56,7 +56,7 @@ void packOpaque(const unsigned char* pixels, std::size_t count, Packed* row, Pac
     unsigned char block[4 * blockPixels];
     for (std::size_t done = 0; done < count; done += blockPixels) {
         const std::size_t now = std::min(blockPixels, count - done);
-        detail::copyOpaque(pixels + 3 * done, block, now);
+        detail::rgbToRgba(pixels + 3 * done, block, now);
         packAll(block, now, row + done, pack);
     }
 }

@@ -115,7 +115,7 @@ public:
         while (size != 0) {
             const std::size_t run = std::min(size, rowBytes - column);
             const std::size_t place = topFirst ? row : capacity - 1 - row;
-            detail::copySwapped(piece, &bytes[place * rowBytes + column], run, components);
+            detail::bgrToRgb(piece, &bytes[place * rowBytes + column], run, components);
             piece += run;
             size -= run;
             column = 0;

@@ -59,6 +59,7 @@ public:
 
     /// Whether a tag is on. The first verdict on a tag that is kept is final.
     ///
+    /// \param tag      compared byte for byte.
     /// \param remember true keeps the verdict in the tag table.
     bool isEnabled(const std::string& tag, bool remember);
 
@@ -125,6 +126,7 @@ public:
     /// Cost: a map look-up; for a new tag also one pass over the rules.
     explicit LogKey(const std::string& siteTag);
 
+    /// The tag, and whether it is on.
     const std::string& getTag() const { return tag; }
     bool isEnabled() const { return enabled; }
 
@@ -141,9 +143,10 @@ private:
 /// It saves all registrations with the same log but the first the look-up. One thread only.
 class PELLS_API RecurringTag {
 public:
-    /// Registers nothing yet.
+    /// Registers nothing yet. \param recurringTag copied.
     explicit RecurringTag(const std::string& recurringTag);
 
+    /// The tag.
     const std::string& getTag() const { return tag; }
 
     /// Registers the tag once more, as a new LogKey does; the log is created if there is none.

@@ -20,12 +20,14 @@ public:
     ~simple_streambuf() override;
 
 protected:
+    /// Characters in a block unless another size is asked for.
     static constexpr long defaultSize = 1024;
 
     /// \param size characters in the block, at least 1.
     /// \throws std::length_error for a smaller size.
     explicit simple_streambuf(long size = defaultSize);
 
+    /// The size and the start of the block.
     long bufferSize() const;
     C* buffer();
 
@@ -39,6 +41,7 @@ private:
 template <class C = char, class Traits = std::char_traits<C>>
 class PELLS_TEMPLATE_API simple_istreambuf : public simple_streambuf<C, Traits> {
 public:
+    /// \param size characters in the block; 1 leaves none to put back.
     explicit simple_istreambuf(long size = simple_streambuf<C, Traits>::defaultSize);
 
     /// Stores up to `room` characters and returns their number; 0 or -1 when no more can be read.
@@ -55,6 +58,7 @@ protected:
 template <class C = char, class Traits = std::char_traits<C>>
 class PELLS_TEMPLATE_API simple_ostreambuf : public simple_streambuf<C, Traits> {
 public:
+    /// \param size characters in the block.
     explicit simple_ostreambuf(long size = simple_streambuf<C, Traits>::defaultSize);
 
 protected:
@@ -102,6 +106,7 @@ protected:
 template <class C = char, class Traits = std::char_traits<C>>
 class PELLS_TEMPLATE_API tee_ostreambuf : public simple_ostreambuf<C, Traits> {
 public:
+    /// Neither is owned; both outlive the buffer.
     tee_ostreambuf(std::basic_ostream<C, Traits>& firstTarget,
                    std::basic_ostream<C, Traits>& secondTarget);
     ~tee_ostreambuf() override;
@@ -128,6 +133,7 @@ public:
     ~simple_ostream() override = default;
 
 protected:
+    /// The buffer that the stream owns.
     Buffer& ownBuffer() const { return *owned; }
 
 private:
@@ -145,6 +151,7 @@ public:
     ~simple_istream() override = default;
 
 protected:
+    /// The buffer that the stream owns.
     Buffer& ownBuffer() const { return *owned; }
 
 private:
@@ -164,6 +171,7 @@ public:
 template <class C = char, class Traits = std::char_traits<C>>
 class PELLS_TEMPLATE_API tee_ostream : public simple_ostream<C, Traits> {
 public:
+    /// Neither is owned; both outlive the stream.
     tee_ostream(std::basic_ostream<C, Traits>& firstTarget,
                 std::basic_ostream<C, Traits>& secondTarget)
         : simple_ostream<C, Traits>(new tee_ostreambuf<C, Traits>(firstTarget, secondTarget)) {}

@@ -15,13 +15,14 @@ struct Color {
     float a = 0;  ///< alpha
 };
 
-// Hue is in degrees, 0 to 360, where 360 is the red of 0; saturation and value are 0 to 1. A grey
-// has hue 0 and saturation 0. The results are the same to the last bit on every platform.
-
 /// Converts red, green and blue to hue, saturation and value.
+///
+/// Hue is in degrees, 0 to 360, where 360 is the red of 0; all else is 0 to 1, and nothing is
+/// clamped. A grey has hue 0 and saturation 0. The results of the conversions in this file are the
+/// same to the last bit on every platform.
 PELLS_API void RGBtoHSV(float r, float g, float b, float& h, float& s, float& v);
 
-/// Converts hue, saturation and value to red, green and blue.
+/// Converts hue, saturation and value, as above, to red, green and blue.
 ///
 /// A hue above 360, or of -60 and below, gives white unless the saturation is 0.
 PELLS_API void HSVtoRGB(float h, float s, float v, float& r, float& g, float& b);
@@ -41,6 +42,7 @@ PELLS_API std::uint32_t hsv2rgb(std::uint32_t hsv);
 /// Blends two colours in HSV, chroma and lightness evenly and the hue along the shorter arc, where
 /// the colour of more chroma has more pull.
 ///
+/// \param hue1, sat1, val1 the first colour, in the units of RGBtoHSV(); the rest the second.
 /// \param t 0 for the first colour to 1 for the second. Values outside extrapolate as far as
 ///          chroma and lightness allow; what they give is of no use.
 /// \return hue, saturation and value in r, g and b, and 0 in a. The hue may be exactly 360. A grey

@@ -21,10 +21,16 @@ public:
     Material& operator=(const Material&);
     ~Material() override;
 
+    /// The colours that the surface gives back of light from everywhere, of light from a side, and
+    /// as highlights, and the one it shines in by itself. A new material has 0.2, 0.8, 0 and 0 for
+    /// their channels and alpha 1.
     const Color& ambient() const { return ambientColor; }
     const Color& diffuse() const { return diffuseColor; }
     const Color& specular() const { return specularColor; }
     const Color& emissive() const { return emissiveColor; }
+
+    /// The exponent of highlights: the greater, the smaller they are. 0 to 128 by convention; 100
+    /// for a new material.
     float shininess() const { return shininessValue; }
 
     /// Whether ambient and diffuse were last set together.
@@ -32,13 +38,18 @@ public:
 
     /// The name of the texture's picture; empty without one.
     const std::string& textureName() const { return texName; }
+
+    /// How large the texture is on the surface: 2 shows it twice as large. 1 for a new material.
     float textureScale() const { return texScale; }
 
-    /// Rotation of the texture.
+    /// Rotation of the texture, in degrees, counterclockwise.
     float textureAngle() const { return texAngle; }
+
+    /// Whether there is a texture's name.
     bool hasTexture() const { return !texName.empty(); }
 
-    /// These two end ambientAndDiffuse().
+    /// These two end ambientAndDiffuse(). Here and below channels are 0 to 1 by convention; nothing
+    /// checks or clamps them, and nothing in a document either.
     void setAmbient(float r, float g, float b, float a);
     void setAmbient(const Color& color);
     void setDiffuse(float r, float g, float b, float a);
@@ -48,6 +59,7 @@ public:
     void setAmbientAndDiffuse(float r, float g, float b, float a);
     void setAmbientAndDiffuse(const Color& color);
 
+    /// Setters of what the getters above give, in their units and ranges, which are not checked.
     void setSpecular(float r, float g, float b, float a);
     void setSpecular(const Color& color);
     void setEmissive(float r, float g, float b, float a);

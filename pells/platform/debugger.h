@@ -28,8 +28,8 @@ protected:
 /// \return the sink that was set before, or null.
 PELLS_API DebuggerSink* setDebuggerSink(DebuggerSink* sink);
 
-/// Shows a text to whoever debugs the program: to the sink if one is set, else to standard error
-/// while a debugger is attached (looked up at most once a second), else to nobody. On Windows the
+/// Shows a text to the developer: through the sink if one is set, else on standard error while a
+/// debugger is attached (looked up at most once a second), else not at all. On Windows the
 /// default is the system's debugger output.
 PELLS_API void debuggerOutput(const char* text);
 

@@ -48,6 +48,7 @@ private:
 template <class Owner, class T>
 class PELLS_TEMPLATE_API MemberAccessor : public ScalarAccessor<T> {
 public:
+    /// \param position of the member in its class.
     explicit MemberAccessor(T Owner::*position) : member(position) {}
 
     /// \throws std::bad_cast when the object is no Owner.
@@ -120,7 +121,7 @@ public:
     explicit SequenceLoader(Seq* filled) : sequence(filled) {}
 
 protected:
-    Seq* sequence;
+    Seq* sequence;  ///< what is filled
 };
 
 /// Appends each item to the sequence before it is loaded.

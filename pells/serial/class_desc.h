@@ -12,12 +12,14 @@
 
 namespace pells {
 
-/// The fields of one class, one a name. Copies share the fields.
+/// The fields of one class, one per name. Copies share the fields.
 class PELLS_API ClassDescBase {
 public:
+    /// How the fields are held: sorted by name.
     typedef std::vector<boost::intrusive_ptr<Field>,
                         detail::PooledAllocator<boost::intrusive_ptr<Field>>>
         Fields;
+    /// Yields pointers to fields.
     typedef Fields::const_iterator const_iterator;
 
     /// Adds a field, whose order becomes the number of fields held before this call; it replaces
@@ -33,9 +35,11 @@ public:
     /// All fields, in ascending byte order of their names, as is iteration.
     std::vector<boost::intrusive_ptr<Field>> getFields() const { return {begin(), end()}; }
 
+    /// The number of fields.
     unsigned size() const { return static_cast<unsigned>(fields.size()); }
     bool empty() const { return fields.empty(); }
 
+    /// Visit the fields, sorted by name. Valid until one is added.
     const_iterator begin() const { return fields.begin(); }
     const_iterator end() const { return fields.end(); }
 
@@ -47,6 +51,7 @@ protected:
     ClassDescBase& operator=(ClassDescBase&&) = default;
     ~ClassDescBase() = default;
 
+    /// Makes room for so many fields.
     void reserve(unsigned count) { fields.reserve(count); }
 
 private:

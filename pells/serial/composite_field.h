@@ -12,6 +12,8 @@ namespace pells {
 /// A field whose value is an object: an element with one child element a field.
 class PELLS_API CompositeField : public Field {
 public:
+    /// \param fieldName of the object's element.
+    /// \param classDesc the fields of its class.
     CompositeField(std::string_view fieldName, ClassDesc&& classDesc);
     CompositeField(std::string_view fieldName, const ClassDesc& classDesc);
     ~CompositeField() override;

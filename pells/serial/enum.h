@@ -35,6 +35,7 @@ public:
             throw BadEnum("No Enum value '" + name + "' for " + className(typeid(*this)));
     }
 
+    /// The object; never null.
     T* get() const { return &*object; }
     T& operator*() const { return *object; }
     T* operator->() const { return &*object; }

@@ -25,6 +25,7 @@ public:
     explicit Field(std::string_view fieldName);
     ~Field() override;
 
+    /// The name of the field's element.
     const std::string& getName() const { return name; }
 
     /// The index of declaration in the description that the field was last added to; 0 before.

@@ -24,6 +24,8 @@ namespace pells {
 template <class Owner, class T>
 class PELLS_TEMPLATE_API MemberField : public SimpleField<T> {
 public:
+    /// \param fieldName of the member's element.
+    /// \param member    pointer to the data member.
     MemberField(std::string_view fieldName, T Owner::*member)
         : SimpleField<T>(fieldName, new MemberAccessor<Owner, T>(member),
                          detail::handlerFor<T>(fieldName)) {}

@@ -26,6 +26,7 @@ namespace pells {
 template <class Seq>
 class PELLS_TEMPLATE_API SequenceTypeHandler : public TypeHandler<Seq> {
 public:
+    /// What the vector holds.
     typedef typename Seq::value_type Item;
 
     static_assert(!std::is_same_v<Seq, std::vector<bool>>,
@@ -45,6 +46,7 @@ public:
     template <class P>
     class PELLS_TEMPLATE_API SequenceSaver : public Accessor<Item> {
     public:
+        /// \param first, last of items that stay while they are saved.
         SequenceSaver(P first, P last) : current(first), end(last) {}
 
         Item* target(Serializable* /*obj*/) override { return detail::unusedValue<Item>(); }

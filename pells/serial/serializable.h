@@ -38,6 +38,7 @@ public:
     /// "error".
     class PELLS_API SaveFail : public std::runtime_error {
     public:
+        /// \param message what() says, and the log.
         explicit SaveFail(const std::string& message);
         SaveFail(const SaveFail&) = default;
         SaveFail& operator=(const SaveFail&) = default;
@@ -48,6 +49,7 @@ public:
     /// "error".
     class PELLS_API LoadFail : public std::runtime_error {
     public:
+        /// \param message what() says, and the log.
         explicit LoadFail(const std::string& message);
         LoadFail(const LoadFail&) = default;
         LoadFail& operator=(const LoadFail&) = default;
@@ -64,6 +66,7 @@ public:
 
     /// Reads the object from an element. Members that the document leaves out keep their values.
     ///
+    /// \param tag   the object's start tag, or its empty-element tag.
     /// \param field describes the object; null: what getField() returns for the tag's name.
     /// \throws LoadFail for a document that cannot be read, see InTag::parseContents(), or "No
     ///         load() method" when there is no description. The object keeps what was read.

@@ -15,13 +15,15 @@ namespace pells {
 template <class T, class U>
 class PELLS_TEMPLATE_API DelegatorField : public Field {
 public:
+    /// \param valueAccessor finds the values.
+    /// \param valueHandler  writes and reads them.
     DelegatorField(std::string_view fieldName, boost::intrusive_ptr<Accessor<T>> valueAccessor,
                    boost::intrusive_ptr<TypeHandler<U>> valueHandler)
         : Field(fieldName), accessor(std::move(valueAccessor)), handler(std::move(valueHandler)) {}
 
 protected:
-    boost::intrusive_ptr<Accessor<T>> accessor;
-    boost::intrusive_ptr<TypeHandler<U>> handler;
+    boost::intrusive_ptr<Accessor<T>> accessor;    ///< finds the values
+    boost::intrusive_ptr<TypeHandler<U>> handler;  ///< writes and reads them
 };
 
 /// A field whose accessor finds the values and whose handler writes and reads them.

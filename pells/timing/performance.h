@@ -22,6 +22,7 @@ extern template class PELLS_API DemandNamedObject<PerformanceCategory, Performan
 class PELLS_API PerformanceCategory
     : public DemandNamedObject<PerformanceCategory, PerformanceCategory*> {
 public:
+    /// Made by find() and findp(). \param categoryName what the log and the summary call it.
     explicit PerformanceCategory(const std::string& categoryName);
     ~PerformanceCategory() override;
 
@@ -37,6 +38,7 @@ public:
         return elapsed;
     }
 
+    /// The time charged so far, in microseconds, without that of a probe that is running.
     std::uint32_t total() const { return totalTime; }
 
     /// Makes a category the running one at the time t; the one that ran until then waits.

@@ -43,6 +43,7 @@ public:
 
     ~Timer() override;
 
+    /// The time, from a zero of the application's choice.
     virtual Timestamp now() = 0;
 
 protected:

@@ -16,11 +16,14 @@ public:
     /// \param lowHalf  lower 32 bits of the count.
     Timestamp(std::uint32_t highHalf, std::uint32_t lowHalf) : high(highHalf), low(lowHalf) {}
 
+    /// A lower half of 0.
     explicit Timestamp(std::uint32_t highHalf) : high(highHalf) {}
 
+    /// The halves of the count.
     std::uint32_t getHigh() const { return high; }
     std::uint32_t getLow() const { return low; }
 
+    /// Whether this is the earlier time.
     bool operator<(const Timestamp& other) const;
 
     /// This plus a span in microseconds, modulo 2^64.

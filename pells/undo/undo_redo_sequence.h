@@ -18,6 +18,7 @@ public:
     class PELLS_API BatchMethod {
     public:
         virtual ~BatchMethod();
+        /// \param step not null. \return what the caller of the method asks of it.
         virtual bool operator()(boost::intrusive_ptr<UndoableStep> step) const = 0;
     };
 
@@ -43,6 +44,7 @@ public:
     /// The last step that is done, or null.
     boost::intrusive_ptr<UndoableStep> getLast() const;
 
+    /// How many steps are done, and how many are undone.
     int getUndoStackSize() const { return current < 0 ? 0 : current + 1; }
     int getRedoStackSize() const { return static_cast<int>(steps.size()) - getUndoStackSize(); }
 
@@ -73,8 +75,8 @@ public:
 
     /// Reads steps and appends them to those that the history holds; each one replays itself as it
     /// is read. Then invalid steps receive destroy() and are dropped, and all that are left count
-    /// as done: those that were undone before the call, too, although they are not redone. Who does
-    /// not want that calls clearRedoStack() first.
+    /// as done: those that were undone before the call, too, although they are not redone. Call
+    /// clearRedoStack() first to avoid that.
     ///
     /// What fails in a step or in the document (Serializable::LoadFail) passes through; the history
     /// then holds what it held and the steps that were read in whole, with the same consequences.

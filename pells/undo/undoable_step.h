@@ -56,6 +56,7 @@ public:
     /// Whether loading the step replays it; here unless its redo is suppressed.
     virtual bool redoOnLoad() const;
 
+    /// Whether suppressRedo() was called with true.
     bool redoSuppressed() const { return redoIsSuppressed; }
 
 protected:

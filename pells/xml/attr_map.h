@@ -26,6 +26,7 @@ namespace pells {
 /// invalidates iterators.
 class PELLS_API AttrMap {
 public:
+    /// A name and its value, unescaped.
     typedef std::pair<std::string, std::string> Attribute;
 
     AttrMap() = default;
@@ -33,9 +34,11 @@ public:
     AttrMap& operator=(const AttrMap& other);
     ~AttrMap() = default;
 
+    /// The number of attributes.
     std::size_t size() const { return attributes.size(); }
     bool empty() const { return attributes.empty(); }
 
+    /// Removes all attributes.
     void clear();
 
     /// The value of a name, or null.
@@ -65,6 +68,7 @@ public:
                                       Order::const_iterator>
         const_iterator;
 
+    /// Visit the attributes in the order above, which is found by the first visit after a change.
     iterator begin() { return {visitingOrder().begin(), {this}}; }
     iterator end() { return {visitingOrder().end(), {this}}; }
     const_iterator begin() const { return {visitingOrder().begin(), {this}}; }

@@ -19,6 +19,7 @@ class Serializable;
 /// An XML element while it is read or written: a name and attributes.
 class PELLS_API Tag {
 public:
+    /// Visit attributes, as AttrMap's do.
     typedef AttrMap::iterator attr_iterator;
     typedef AttrMap::const_iterator const_attr_iterator;
 
@@ -27,6 +28,7 @@ public:
     Tag& operator=(const Tag&) = default;
     virtual ~Tag();
 
+    /// The element's name; "" for a tag that holds a text token.
     const std::string& getName() const { return name; }
 
     /// The value of an attribute; "" when the element has none of that name. Valid until the
@@ -44,8 +46,8 @@ public:
     const_attr_iterator endAttrs() const { return attrs.end(); }
 
 protected:
-    std::string name;
-    AttrMap attrs;
+    std::string name;  ///< see getName()
+    AttrMap attrs;     ///< unescaped
 };
 
 /// An element that is read. It lives while its content is read and shares its parent's tokenizer.
@@ -89,6 +91,8 @@ public:
     /// Reading recurses, so the limit protects the stack: the default is safe where it has 1 MiB.
     /// Unrecognised elements do not count: they are skipped without recursion at any depth.
     static unsigned maximumDepth();
+
+    /// Takes effect at once. \param levels at least 1.
     static void setMaximumDepth(unsigned levels);
 
     /// How much text a document may have that is read into objects, in bytes from the start tag of
@@ -99,7 +103,7 @@ public:
     static void setMaximumDocumentSize(std::uint64_t bytes);
 
 protected:
-    typedef XMLTokenizer::Token Token;
+    typedef XMLTokenizer::Token Token;  ///< for short
 
     /// Makes a child without data: one level deeper, with the parent's tokenizer and version.
     struct ChildOf {
@@ -111,10 +115,11 @@ protected:
     void setData(const Token& token);
     void setData(Token&& token);
 
+    /// Makes a text the current one, to be scanned from its start.
     void setText(std::string&& newText);
 
-    XMLTokenizer& tokenizer;
-    unsigned depth = 1;
+    XMLTokenizer& tokenizer;  ///< shared with all tags of the document
+    unsigned depth = 1;       ///< 1 for the root element
     /// How far the document may reach in the tokenizer's stream.
     std::uint64_t documentEnd;
 
@@ -127,10 +132,13 @@ private:
 /// An element with content, which is read up to its end tag.
 class PELLS_API OpenTag : public InTag {
 public:
-    /// The root element. \param token the start tag that was just read.
+    /// The root element.
+    ///
+    /// \param source not owned; outlives the tag.
+    /// \param token  the start tag that was just read.
     OpenTag(XMLTokenizer& source, const Token& token);
 
-    /// A child element.
+    /// A child element, with the start tag that was just read; the parent outlives it.
     OpenTag(InTag& parent, const Token& token);
     OpenTag(InTag& parent, Token&& token);
 
@@ -153,10 +161,13 @@ private:
 /// An empty element.
 class PELLS_API SingleTag : public InTag {
 public:
-    /// The root element. \param token the empty-element tag that was just read.
+    /// The root element.
+    ///
+    /// \param source not owned; outlives the tag.
+    /// \param token  the empty-element tag that was just read.
     SingleTag(XMLTokenizer& source, const Token& token);
 
-    /// A child element.
+    /// A child element, with the empty-element tag that was just read; the parent outlives it.
     SingleTag(InTag& parent, const Token& token);
     SingleTag(InTag& parent, Token&& token);
 
@@ -178,7 +189,7 @@ public:
 /// this one, writeCloseTag(true). Each level is indented by four spaces more.
 class PELLS_API OutTag : public Tag {
 public:
-    /// The root element.
+    /// The root element. The stream is not owned and outlives the document's tags.
     OutTag(std::ostream& stream, const std::string& tagName);
 
     /// A child of the outer element's name and attributes: a copy is one level deeper. The outer
@@ -200,7 +211,10 @@ public:
     /// The names of the elements from the root to this one, as in "root/history/stack".
     std::string getPath() const;
 
+    /// Changes the name that is written, which is not checked.
     void setTag(const std::string& tagName);
+
+    /// Removes all attributes.
     void clearAttrs();
 
     /// Writes the indentation, the start tag and, on demand, a line feed.

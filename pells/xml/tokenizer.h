@@ -39,7 +39,7 @@ namespace pells {
 /// The tokens end for good, with T_EOF, at the first place that is none of this: the end of the
 /// stream, but also a document type declaration, a CDATA section, another processing instruction, a
 /// name with ":" or ".", an unquoted attribute value or an "&" that begins no reference. Malformed
-/// text is no error of the tokenizer's: whoever knows the nesting sees that elements are still
+/// text is no error to the tokenizer: code that knows the nesting sees that elements are still
 /// open.
 ///
 /// Input is read in one pass, straight from the stream's buffer, and holds no more memory than the
@@ -49,6 +49,7 @@ class PELLS_API XMLTokenizer {
 public:
     /// One token, copied by value.
     struct PELLS_API Token {
+        /// What a token is. The numbers are those of log lines.
         enum TokenType : int {
             T_IGNORE = 0,  ///< never handed out
             T_SINGLE = 1,  ///< an empty-element tag, `<a x="1"/>`
@@ -57,8 +58,10 @@ public:
             T_TEXT = 4,    ///< character data
             T_EOF = 5      ///< end of input, or of what can be recognised
         };
+        /// A name and a decoded value.
         typedef std::pair<std::string, std::string> Attribute;
 
+        /// What the rest means.
         TokenType type = T_IGNORE;
         /// The element's name, or the decoded character data; empty for T_EOF.
         std::string value;
@@ -69,6 +72,7 @@ public:
     /// A token is larger than maximumTokenSize(), or goes on where getToken() was told to stop.
     class PELLS_API TooLarge : public std::runtime_error {
     public:
+        /// \param message says which limit was passed.
         explicit TooLarge(const std::string& message);
         TooLarge(const TooLarge&) = default;
         TooLarge& operator=(const TooLarge&) = default;

@@ -104,7 +104,7 @@ void AliasTree::readLinks(Folder& folder, FolderWalk& walk) {
     std::string line;
     std::vector<std::string> pieces;
     bool cut = false;
-    while (readLine(container->getStream(), line) && walk.payForLine(line.size())) {
+    while (readLine(container->getStream(), line) && walk.chargeLine(line.size())) {
         const bool isPiece = cut || line.size() >= maxLineLength;
         cut = line.size() >= maxLineLength;
         if (!line.empty() && line.back() == '\r')
@@ -125,7 +125,7 @@ void AliasTree::readLinks(Folder& folder, FolderWalk& walk) {
 ///        are the assets' own.
 void AliasTree::addAliases(const boost::shared_ptr<Folder>& folder, const std::string& prefix,
                            bool linked, FolderWalk& walk) {
-    if (linked && !walk.payForName(prefix.size()))
+    if (linked && !walk.chargeName(prefix.size()))
         return;
     const std::string start = prefix + folder->separator;
     for (const std::string& file : folder->files) {
@@ -145,7 +145,7 @@ void AliasTree::addAliases(const boost::shared_ptr<Folder>& folder, const std::s
 
 /// False when there are too many aliases.
 bool AliasTree::addAlias(const std::string& from, const std::string& to, FolderWalk& walk) {
-    if (!walk.payForName(from.size() + to.size()))
+    if (!walk.chargeName(from.size() + to.size()))
         return false;
     if (from == to)
         return true;

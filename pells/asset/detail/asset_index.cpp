@@ -24,7 +24,7 @@ class MissingFolders {
 public:
     explicit MissingFolders(const fs::path& assetRootPath) : root(assetRootPath) {}
 
-    bool hold(const std::string& name) {
+    bool contain(const std::string& name) {
         const std::string::size_type slash = name.rfind('/');
         // For a name that may be too long, the file system's answer is another one.
         if (slash == std::string::npos || name.size() > 200)
@@ -159,7 +159,7 @@ void AssetIndex::preferNewerFiles(const std::string& root) {
     MissingFolders missingFolders(root);
     for (auto entry = sources.begin(); entry != sources.end(); ++entry) {
         const std::string& name = entry->name();
-        if (missingFolders.hold(name) || !isNativeName(name))
+        if (missingFolders.contain(name) || !isNativeName(name))
             continue;
         const fs::path file = fs::path(root) / name;
         boost::system::error_code error;

@@ -53,9 +53,9 @@ bool FolderWalk::enter(const std::string& path, const std::string& name, bool in
                    typeOf(child.real) != fs::file_not_found;
     if (child.onDisk) {
         child.behindLink = child.behindLink || mayLeadBack(child.real, name);
-        child.onDisk = !child.behindLink || (!isEntered(child.real) && payForLinkedFolder());
+        child.onDisk = !child.behindLink || (!isEntered(child.real) && chargeLinkedFolder());
     }
-    if (!child.onDisk && (!inArchives || !payForPath(path)))
+    if (!child.onDisk && (!inArchives || !chargePath(path)))
         return false;
     chain.push_back(child);
     return true;
@@ -70,7 +70,7 @@ bool FolderWalk::isEntered(const fs::path& path) const {
 
 /// Links of the file system that cross may offer each folder under any number of names without
 /// ever leading in a circle.
-bool FolderWalk::payForLinkedFolder() {
+bool FolderWalk::chargeLinkedFolder() {
     if (linkedFoldersLeft == 0)
         return false;
     --linkedFoldersLeft;
@@ -79,12 +79,12 @@ bool FolderWalk::payForLinkedFolder() {
     return true;
 }
 
-/// Pays for a folder that only archives have: one long name of a member goes through many
+/// Charges a folder that only archives have: one long name of a member goes through many
 /// folders, whose paths are each nearly as long.
-bool FolderWalk::payForPath(const std::string& path) {
-    const std::uint64_t price = path.size() + AssetIndex::nameOverhead;
-    if (price <= pathsLeft) {
-        pathsLeft -= price;
+bool FolderWalk::chargePath(const std::string& path) {
+    const std::uint64_t cost = path.size() + AssetIndex::nameOverhead;
+    if (cost <= pathsLeft) {
+        pathsLeft -= cost;
         return true;
     }
     if (pathsLeft != 0)
@@ -100,10 +100,10 @@ void FolderWalk::reportDepth(const std::string& path) {
     depthReported = true;
 }
 
-bool FolderWalk::pay(std::uint64_t& left, std::uint64_t price) {
-    if (price >= left)
+bool FolderWalk::spend(std::uint64_t& left, std::uint64_t cost) {
+    if (cost >= left)
         return exhaust(left);
-    left -= price;
+    left -= cost;
     return true;
 }
 

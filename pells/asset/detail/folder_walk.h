@@ -35,14 +35,14 @@ public:
     /// Whether a link stands for the current folder or for one that it is in.
     bool isLinked() const { return chain.back().linked; }
 
-    /// Pays for a line of a ".symlinks" file; false when there has been too much text.
-    bool payForLine(std::size_t length) { return pay(textLeft, 128 + length); }
+    /// Charges a line of a ".symlinks" file; false when there has been too much text.
+    bool chargeLine(std::size_t length) { return spend(textLeft, 128 + length); }
 
-    /// Pays for a name that goes through a link; false when there have been too many.
-    bool payForName(std::size_t length) { return pay(namesLeft, 16 + length); }
+    /// Charges a name that goes through a link; false when there have been too many.
+    bool chargeName(std::size_t length) { return spend(namesLeft, 16 + length); }
 
     /// Whether one more alias may be added; if not, there will be no more at all.
-    bool mayGrow(std::size_t aliasCount) { return aliasCount < limit || pay(namesLeft, namesLeft); }
+    bool mayGrow(std::size_t aliasCount) { return aliasCount < limit || exhaust(namesLeft); }
 
 private:
     struct Folder {
@@ -54,10 +54,10 @@ private:
     };
 
     bool isEntered(const boost::filesystem::path& path) const;
-    bool payForLinkedFolder();
-    bool payForPath(const std::string& path);
+    bool chargeLinkedFolder();
+    bool chargePath(const std::string& path);
     void reportDepth(const std::string& path);
-    bool pay(std::uint64_t& left, std::uint64_t price);
+    bool spend(std::uint64_t& left, std::uint64_t cost);
     bool exhaust(std::uint64_t& left);
     std::uint64_t inProportion(std::uint64_t bytesPerAlias) const;
 

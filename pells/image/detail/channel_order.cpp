@@ -92,7 +92,7 @@ std::size_t widenFast(const unsigned char* /*from*/, unsigned char* /*to*/,
 
 }  // namespace
 
-void copySwapped(const unsigned char* from, unsigned char* to, std::size_t bytes, int components) {
+void bgrToRgb(const unsigned char* from, unsigned char* to, std::size_t bytes, int components) {
     if (components < 3) {
         std::memcpy(to, from, bytes);
         return;
@@ -102,7 +102,7 @@ void copySwapped(const unsigned char* from, unsigned char* to, std::size_t bytes
     swapPixels(from + done, to + done, bytes - done, pixelBytes);
 }
 
-void copyOpaque(const unsigned char* from, unsigned char* to, std::size_t pixels) {
+void rgbToRgba(const unsigned char* from, unsigned char* to, std::size_t pixels) {
     for (std::size_t i = widenFast(from, to, pixels); i < pixels; ++i) {
         std::memcpy(to + 4 * i, from + 3 * i, 3);
         to[4 * i + 3] = 255;

@@ -8,10 +8,10 @@ namespace pells::detail {
 ///
 /// \param components bytes per pixel: 1, 3 or 4. Single bytes are copied as they are.
 /// \param bytes      a multiple of components. The ranges must not overlap.
-void copySwapped(const unsigned char* from, unsigned char* to, std::size_t bytes, int components);
+void bgrToRgb(const unsigned char* from, unsigned char* to, std::size_t bytes, int components);
 
 /// Copies opaque pixels of three bytes to four bytes each, the fourth 255. The ranges must not
 /// overlap.
-void copyOpaque(const unsigned char* from, unsigned char* to, std::size_t pixels);
+void rgbToRgba(const unsigned char* from, unsigned char* to, std::size_t pixels);
 
 }  // namespace pells::detail

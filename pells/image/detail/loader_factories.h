@@ -2,8 +2,8 @@
 
 namespace pells::detail {
 
-/// Does nothing. Whoever calls it makes a static link keep the object file with the factories of
-/// the library's image loaders, which nobody else names.
+/// Does nothing. A call makes a static link keep the object file with the factories of the
+/// library's image loaders, which nothing else refers to.
 void keepLoaderFactories();
 
 }  // namespace pells::detail

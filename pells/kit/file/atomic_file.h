@@ -14,6 +14,7 @@ namespace kit {
 /// A file could not be read or written. what() is "PATH: REASON", as the system words the reason.
 class PELLS_KIT_API FileError : public std::runtime_error {
 public:
+    /// \param why the reason, in words.
     FileError(const std::string& filePath, const std::string& why);
 
     /// \param errorNumber a value of errno.
@@ -22,6 +23,7 @@ public:
     FileError& operator=(const FileError&) = default;
     ~FileError() override;
 
+    /// The file, and what was wrong.
     const std::string& getPath() const { return path; }
     const std::string& getReason() const { return reason; }
 

@@ -19,8 +19,8 @@ PELLS_API std::string registeredName(const std::type_info& type);
 /// A new object of the class of that name; null when no SerializableFactory makes one.
 PELLS_API std::unique_ptr<Serializable> makeObject(const std::string& className);
 
-/// Does nothing. Who makes objects by class name calls it, so that a static link keeps the
-/// factories of the library's own classes, which nobody else names. Defined where all of those
+/// Does nothing. What makes objects by class name calls it, so that a static link keeps the
+/// factories of the library's own classes, which nothing else refers to. Defined where all of those
 /// classes are known, above their subsystems.
 void keepLibraryClasses();
 
