@@ -2,13 +2,18 @@
 # documents. The components are Runtime, Development, Documentation and Tools.
 include(CMakePackageConfigHelpers)
 
+set(headers ${CMAKE_INSTALL_INCLUDEDIR})
+if(IS_ABSOLUTE ${headers})
+    # CMake 3.25 puts the prefix even before an absolute folder when it exports a file set.
+    file(RELATIVE_PATH headers ${CMAKE_INSTALL_PREFIX} ${headers})
+endif()
 install(TARGETS pells pells_kit pells_plugin EXPORT pellsTargets
     RUNTIME COMPONENT Runtime
     LIBRARY COMPONENT Runtime NAMELINK_COMPONENT Development
     ARCHIVE COMPONENT Development
     # CMake before 3.23 finds the headers by this; it knows no file sets.
-    INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}
-    FILE_SET HEADERS COMPONENT Development)
+    INCLUDES DESTINATION ${headers}
+    FILE_SET HEADERS DESTINATION ${headers} COMPONENT Development)
 
 set(package_directory ${CMAKE_INSTALL_LIBDIR}/cmake/pells)
 install(EXPORT pellsTargets NAMESPACE pells:: DESTINATION ${package_directory} COMPONENT Development)
