@@ -14,7 +14,7 @@ namespace {
 
 const char fontFamily[] = "DejaVu Sans";
 const char ellipsis[] = "\xE2\x80\xA6";
-const double pi = 3.14159265358979323846;
+const double halfTurn = 3.14159265358979323846;
 
 /// Longer texts are shortened before they are measured: no line of a sheet holds as much.
 const std::size_t longestText = 600;
@@ -69,10 +69,10 @@ void Canvas::roundedPath(const Box& box, double radius) {
     const double right = box.x + box.width - radius;
     const double bottom = box.y + box.height - radius;
     cairo_new_sub_path(cairo.get());
-    cairo_arc(cairo.get(), right, box.y + radius, radius, -pi / 2, 0);
-    cairo_arc(cairo.get(), right, bottom, radius, 0, pi / 2);
-    cairo_arc(cairo.get(), box.x + radius, bottom, radius, pi / 2, pi);
-    cairo_arc(cairo.get(), box.x + radius, box.y + radius, radius, pi, 3 * pi / 2);
+    cairo_arc(cairo.get(), right, box.y + radius, radius, -halfTurn / 2, 0);
+    cairo_arc(cairo.get(), right, bottom, radius, 0, halfTurn / 2);
+    cairo_arc(cairo.get(), box.x + radius, bottom, radius, halfTurn / 2, halfTurn);
+    cairo_arc(cairo.get(), box.x + radius, box.y + radius, radius, halfTurn, 3 * halfTurn / 2);
     cairo_close_path(cairo.get());
 }
 

@@ -19,6 +19,8 @@ namespace pells_tool {
 
 namespace {
 
+typedef pells::AssetManager::Resolution Resolution;
+
 const char definitionsName[] = "Data/images.xml";
 
 /// The image type of a TGA header, or -1 without one.
@@ -67,7 +69,6 @@ std::vector<std::string> originOf(const pells::ImageLoaderBase& loader) {
     const auto* const tga = dynamic_cast<const pells::TGAFileLoader*>(&loader);
     if (!tga || dynamic_cast<const pells::PellTGAFileLoader*>(&loader))
         return {};
-    typedef pells::AssetManager::Resolution Resolution;
     const Resolution found = pells::AssetManager::instance().resolve(tga->getFileName());
     std::vector<std::string> lines;
     if (!found.alias.empty())

@@ -12,22 +12,22 @@ namespace pells_tool {
 namespace {
 
 // Distances in pixels.
-const int margin = SheetRows::margin;
-const int gap = 18;
-const int padding = 12;
-const int boxWidth = 236;
-const int boxHeight = 220;
-const int cardWidth = boxWidth + 2 * padding;
-const int cardHeight = boxHeight + 2 * padding + 192;
+const int sheetMargin = SheetRows::margin;
+const int cardGap = 18;
+const int cardPadding = 12;
+const int sphereBoxWidth = 236;
+const int sphereBoxHeight = 220;
+const int cardWidth = sphereBoxWidth + 2 * cardPadding;
+const int cardHeight = sphereBoxHeight + 2 * cardPadding + 192;
 const int chipWidth = 30;
 const int chipHeight = 14;
 const double columnWidth = 37;
 
-const Paint cardPaint = 0xFFFFFF;
+const Paint swatchPaint = 0xFFFFFF;
 const Paint cardBorder = 0xD5DAE0;
-const Paint boxPaint = 0x39424E;
+const Paint sphereBoxPaint = 0x39424E;
 const Paint badgePaint = 0x2B6CB0;
-const TextStyle nameStyle = {14, 0x1F2933, true};
+const TextStyle materialStyle = {14, 0x1F2933, true};
 const TextStyle originStyle = {11, 0x7B8794, false};
 const TextStyle headingStyle = {10, 0x9AA5B1, false};
 const TextStyle labelStyle = {11, 0x52606D, false};
@@ -35,9 +35,9 @@ const TextStyle valueStyle = {11, 0x1F2933, false};
 const TextStyle badgeStyle = {17, 0xFFFFFF, true};
 
 /// Few in one row, more in a sheet that is a little wider than high.
-SheetLayout layoutFor(std::size_t cards) {
+SheetLayout swatchLayout(std::size_t cards) {
     const int columns = cards <= 4 ? static_cast<int>(cards) : sheetColumns(cards, 1.3, 3, 6);
-    return {columns, cardWidth, cardHeight, gap, margin, margin - gap};
+    return {columns, cardWidth, cardHeight, cardGap, sheetMargin, sheetMargin - cardGap};
 }
 
 std::string number(float value) {
@@ -73,7 +73,7 @@ Thumbnail chipOf(const pells::Color& color) {
 
 void drawRight(Canvas& canvas, const std::string& text, double right, double baseline,
                const TextStyle& style) {
-    canvas.text(text, right - canvas.textWidth(text, style), baseline, boxWidth, style);
+    canvas.text(text, right - canvas.textWidth(text, style), baseline, sphereBoxWidth, style);
 }
 
 void drawColor(Canvas& canvas, const Box& line, const char* label, const pells::Color& color) {
@@ -142,7 +142,7 @@ bool isOpaque(const Thumbnail& sphere) {
 
 void drawSphere(Canvas& canvas, const Box& box, const Thumbnail& sphere) {
     if (isOpaque(sphere))
-        canvas.fill(box, boxPaint, 4);
+        canvas.fill(box, sphereBoxPaint, 4);
     else
         canvas.checkerboard(box);
     canvas.picture(box.x + std::floor((box.width - sphere.width) / 2),
@@ -158,27 +158,27 @@ void drawBadge(Canvas& canvas, double x, double y, const std::string& operation)
 
 void drawCard(Canvas& canvas, double left, const SwatchCard& card) {
     const Box frame = {left, 0, cardWidth, cardHeight};
-    const Box box = {left + padding, padding, boxWidth, boxHeight};
-    canvas.fill(frame, cardPaint, 8);
+    const Box box = {left + cardPadding, cardPadding, sphereBoxWidth, sphereBoxHeight};
+    canvas.fill(frame, swatchPaint, 8);
     canvas.outline(frame, cardBorder, 8);
     drawSphere(canvas, box, card.sphere);
     const double below = box.y + box.height;
-    canvas.text(card.name, box.x, below + 22, box.width, nameStyle);
+    canvas.text(card.name, box.x, below + 22, box.width, materialStyle);
     canvas.text(card.origin, box.x, below + 38, box.width, originStyle, true);
     drawValues(canvas, {box.x, below + 60, box.width, 0}, card.material);
     if (!card.operation.empty())
-        drawBadge(canvas, left - gap / 2.0, box.y + box.height / 2, card.operation);
+        drawBadge(canvas, left - cardGap / 2.0, box.y + box.height / 2, card.operation);
 }
 
 }  // namespace
 
 std::size_t SwatchSheet::mostCards() {
-    return sheetCapacity(layoutFor(std::numeric_limits<int>::max()));
+    return sheetCapacity(swatchLayout(std::numeric_limits<int>::max()));
 }
 
 SwatchSheet::SwatchSheet(const std::string& path, std::size_t cards)
-    : rows(path, layoutFor(cards), cards, "Too many materials for one picture") {
-    rows.write(rows.strip(margin));
+    : rows(path, swatchLayout(cards), cards, "Too many materials for one picture") {
+    rows.write(rows.strip(sheetMargin));
 }
 
 void SwatchSheet::add(const SwatchCard& card) {
@@ -186,7 +186,7 @@ void SwatchSheet::add(const SwatchCard& card) {
 }
 
 void SwatchSheet::finish() {
-    rows.finish(rows.strip(margin - gap));
+    rows.finish(rows.strip(sheetMargin - cardGap));
 }
 
 }  // namespace pells_tool

@@ -3,6 +3,8 @@
 #include <new>
 #include <utility>
 
+#include "pells/core/export.h"
+
 namespace pells {
 
 /// Holds a function-local static that is never destroyed.

@@ -3,6 +3,8 @@
 /// \file
 /// Symbol visibility of the kit; see pells/core/export.h.
 
+#include "pells/core/export.h"
+
 #if defined(_WIN32)
 #if defined(PELLS_STATIC)
 #define PELLS_KIT_API

@@ -9,8 +9,8 @@ namespace pells {
 
 namespace {
 
-struct Hsv {
-    explicit Hsv(const Color& color) { RGBtoHSV(color.r, color.g, color.b, h, s, v); }
+struct HsvColor {
+    explicit HsvColor(const Color& color) { RGBtoHSV(color.r, color.g, color.b, h, s, v); }
 
     float h;
     float s;
@@ -28,8 +28,8 @@ float middleHue(float a, float b) {
 }
 
 Color blended(const Color& first, const Color& second) {
-    const Hsv a(first);
-    const Hsv b(second);
+    const HsvColor a(first);
+    const HsvColor b(second);
     Color result;
     HSVtoRGB(middleHue(a.h, b.h), (a.s + b.s) * 0.5f, (a.v + b.v) * 0.5f, result.r, result.g,
              result.b);

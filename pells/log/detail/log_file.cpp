@@ -6,12 +6,12 @@ namespace pells::detail {
 
 namespace {
 
-const long blockSize = 8192;
+const long logBlockSize = 8192;
 
 }  // namespace
 
 LogFileBuffer::LogFileBuffer(std::string filePath)
-    : simple_ostreambuf<char>(blockSize), path(std::move(filePath)) {}
+    : simple_ostreambuf<char>(logBlockSize), path(std::move(filePath)) {}
 
 LogFileBuffer::~LogFileBuffer() {
     syncBeforeEnd();

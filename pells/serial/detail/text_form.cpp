@@ -30,12 +30,20 @@ bool scanPlain(const std::string& text, T& value) {
     const char* const digits = at != end && *at == '-' ? at + 1 : at;
     if (digits == end || !isDigit(*digits))
         return false;
-    T scanned;
-    const std::from_chars_result result = std::from_chars(at, end, scanned);
-    if (result.ec != std::errc() || result.ptr != end)
+#if !defined(__cpp_lib_to_chars)
+    // Such a standard library, of which libc++ is one, reads only integers from characters.
+    if constexpr (std::is_floating_point_v<T>)
         return false;
-    value = scanned;
-    return true;
+    else
+#endif
+    {
+        T scanned;
+        const std::from_chars_result result = std::from_chars(at, end, scanned);
+        if (result.ec != std::errc() || result.ptr != end)
+            return false;
+        value = scanned;
+        return true;
+    }
 }
 
 template <>

@@ -1,0 +1,3 @@
+int own() {
+    return 0;
+}
