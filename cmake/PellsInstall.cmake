@@ -2,6 +2,13 @@
 # documents. The components are Runtime, Development, Documentation and Tools.
 include(CMakePackageConfigHelpers)
 
+set(package_directory ${CMAKE_INSTALL_LIBDIR}/cmake/pells)
+if(IS_ABSOLUTE ${package_directory})
+    pells_set_plugin_specs(INSTALL_INTERFACE ${package_directory})
+else()
+    pells_set_plugin_specs(INSTALL_INTERFACE $<INSTALL_PREFIX>/${package_directory})
+endif()
+
 set(headers ${CMAKE_INSTALL_INCLUDEDIR})
 if(IS_ABSOLUTE ${headers})
     # CMake 3.25 puts the prefix even before an absolute folder when it exports a file set.
@@ -15,7 +22,6 @@ install(TARGETS pells pells_kit pells_plugin EXPORT pellsTargets
     INCLUDES DESTINATION ${headers}
     FILE_SET HEADERS DESTINATION ${headers} COMPONENT Development)
 
-set(package_directory ${CMAKE_INSTALL_LIBDIR}/cmake/pells)
 install(EXPORT pellsTargets NAMESPACE pells:: DESTINATION ${package_directory} COMPONENT Development)
 configure_package_config_file(cmake/pellsConfig.cmake.in ${PROJECT_BINARY_DIR}/pellsConfig.cmake
     INSTALL_DESTINATION ${package_directory})

@@ -18,7 +18,7 @@ const int endOfFile = -1;
 const int endMark = 0x1A;
 
 /// The white space of the classic locale.
-bool isSpace(char c) {
+bool isWordEnd(char c) {
     return c == ' ' || (c >= '\t' && c <= '\r');
 }
 
@@ -189,13 +189,13 @@ private:
     /// file ends before it.
     bool readWord(std::string& word) {
         do {
-            while (next != end && isSpace(*next))
+            while (next != end && isWordEnd(*next))
                 ++next;
         } while (next == end && refill());
         word.clear();
         while (next != end) {
             const char* const start = next;
-            while (next != end && !isSpace(*next))
+            while (next != end && !isWordEnd(*next))
                 ++next;
             word.append(start, next);
             if (next != end || !refill())

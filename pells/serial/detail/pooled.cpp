@@ -17,7 +17,7 @@ const bool pooling = true;
 const bool pooling = true;
 #endif
 
-const std::size_t step = 16;
+const std::size_t poolStep = 16;
 const std::size_t largest = 256;
 const unsigned keptOfASize = 256;
 
@@ -39,17 +39,17 @@ public:
     }
 
     void* take(std::size_t size) {
-        List& list = lists[(size - 1) / step];
+        List& list = lists[(size - 1) / poolStep];
         Block* const block = list.first;
         if (!block)
-            return ::operator new((size + step - 1) / step * step);
+            return ::operator new((size + poolStep - 1) / poolStep * poolStep);
         list.first = block->next;
         ++list.room;
         return block;
     }
 
     void give(void* memory, std::size_t size) noexcept {
-        List& list = lists[(size - 1) / step];
+        List& list = lists[(size - 1) / poolStep];
         if (list.room == 0) {
             ::operator delete(memory);
             return;
@@ -67,7 +67,7 @@ private:
         unsigned room = keptOfASize;
     };
 
-    List lists[largest / step];
+    List lists[largest / poolStep];
 };
 
 FreeLists freeLists;
