@@ -141,4 +141,14 @@ TEST_F(AssetManagerTest, TellsFilesFromFoldersAndListsEachNameOnce) {
     EXPECT_FALSE(manager().isDir("none"));
 }
 
+TEST(AssetOpener, TellsTimesBeyond32BitsByTheNearestOne) {
+    const std::pair<std::int64_t, std::int32_t> times[] = {
+        {7, 7}, {std::int64_t{1} << 40, 2147483647}, {-(std::int64_t{1} << 40), -2147483647 - 1}};
+    for (const auto& each : times) {
+        const pells::AssetManager::FileOpener opener("path", each.first);
+        EXPECT_EQ(opener.getWriteTime(), each.first);
+        EXPECT_EQ(opener.getTimestamp(), each.second);
+    }
+}
+
 }  // namespace

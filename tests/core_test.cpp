@@ -1,6 +1,7 @@
 #include <boost/lexical_cast.hpp>
 #include <boost/smart_ptr/intrusive_ptr.hpp>
 #include <sstream>
+#include "pells/core/check_memory.h"
 
 #include "pells/core/factory.h"
 #include "pells/core/named_object.h"
@@ -142,6 +143,15 @@ TEST(Strings, HaveASingularThatFollowsTheLastLetters) {
     EXPECT_EQ(getSingularName("ies"), "y");
     EXPECT_EQ(getSingularName("s"), "");
     EXPECT_EQ(getSingularName(""), "Item");
+}
+
+TEST(CheckMemory, TakesAnyNameWithoutAnAllocatorThatCounts) {
+    CheckMemory::startMemCheck();
+    CheckMemory::breakAt(7);
+    CheckMemory::removeMemTracking("none");
+    CheckMemory::setMemTracking("some");
+    CheckMemory::dumpMemory("some");
+    CheckMemory::removeMemTracking("some");
 }
 
 }  // namespace

@@ -162,4 +162,18 @@ TEST(HeaderNumbers, AreLittleEndian) {
     EXPECT_EQ(Image_base::getCharValue(bytes), 255);
 }
 
+struct Emptied : pells::Image_base {
+    using Image_base::Image_base;
+    using Image_base::init;
+};
+
+TEST(Image, IsEmptyAfterInit) {
+    Emptied image(3, 2);
+    image.init();
+    EXPECT_FALSE(image.isValid());
+    EXPECT_EQ(image.getWidth() + image.getHeight() + image.getNumComponents(), 0);
+    image.colorize(0, 0, 0, 255, 255, 255);
+    EXPECT_FALSE(image.isGrayscale());
+}
+
 }  // namespace

@@ -235,4 +235,11 @@ TEST_F(LogTest, ThatCannotOpenItsFileStillSpeaksToTheDebuggerWhileItIsThere) {
     EXPECT_EQ(platform::setDebuggerSink(nullptr), nullptr);
 }
 
+TEST_F(LogTest, WritesNumbersOfEveryWidth) {
+    PELLS_LOG("app", 18446744073709551615ULL << ' ' << (-9223372036854775807LL - 1) << ' '
+                                             << 4294967295UL << ' ' << -2147483647L);
+    EXPECT_EQ(logLines("app: "),
+              Lines{"18446744073709551615 -9223372036854775808 4294967295 -2147483647"});
+}
+
 }  // namespace

@@ -66,4 +66,52 @@ TEST(OutTags, WriteLinesOfTheirDepth) {
               "    </renamed>\n");
 }
 
+TEST(Attributes, AreCopiedWithTheirIndex) {
+    AttrMap attrs;
+    for (int i = 0; i < 100; ++i)
+        attrs.set("n" + std::to_string(i), "old");
+    const AttrMap copy(attrs);
+    attrs.set("n99", "new");
+    EXPECT_EQ(*copy.find("n99"), "old");
+    AttrMap assigned;
+    assigned = attrs;
+    EXPECT_EQ(*assigned.find("n99"), "new");
+    EXPECT_EQ(Pairs(assigned.begin(), assigned.end()), Pairs(attrs.begin(), attrs.end()));
+}
+
+TEST(Tags, AreCopiedAndMadeOfTokensThatStay) {
+    typedef pells::XMLTokenizer::Token Token;
+    std::istringstream in("<root a='1'/>");
+    pells::XMLTokenizer tokenizer(in);
+    const Token root = tokenizer.getToken();
+    pells::SingleTag single(tokenizer, root);
+    const pells::SingleTag copy(single);
+    EXPECT_EQ(copy.getAttr("a"), "1");
+    Token child;
+    child.type = Token::T_OPEN;
+    child.value = "child";
+    EXPECT_EQ(pells::OpenTag(single, child).getName(), "child");
+    EXPECT_EQ(pells::SingleTag(single, child).getName(), "child");
+    child.type = Token::T_TEXT;
+    pells::OpenTag text(single, std::move(child));
+    EXPECT_EQ(text.getText(), "child");
+    EXPECT_EQ(text.getName(), "");
+    int scanned = 7;
+    EXPECT_FALSE(pells::OpenTag(text).textStream() >> scanned);
+}
+
+struct BareTag : OutTag {
+    using OutTag::OutTag;
+    using OutTag::writeTagAndAttrs;
+};
+
+TEST(Tags, WriteAttributesOfAnyLength) {
+    std::ostringstream out;
+    BareTag tag(out, "a");
+    const std::string longValue(2000, 'x');
+    tag.setAttr("n", longValue);
+    tag.writeTagAndAttrs();
+    EXPECT_EQ(out.str(), "a n=\"" + longValue + '"');
+}
+
 }  // namespace

@@ -151,4 +151,13 @@ TEST_F(ProbeTest, KeepsItsVerdictAndItsLabelToTheEnd) {
     EXPECT_EQ(lines[0].find("time.detail.kept: Leaving  a label that is too long to be kept"), 0u);
 }
 
+TEST(Timer, NamesTheFactoryThatIsMissing) {
+    try {
+        pells::Timer::instance();
+        FAIL() << "there is a timer";
+    } catch (const pells::Timer::NoImplementation& missing) {
+        EXPECT_NE(std::string(missing.what()).find("timerFactory(\"Timer\")"), std::string::npos);
+    }
+}
+
 }  // namespace

@@ -242,4 +242,16 @@ TEST_F(UndoTest, KeepsWholeStepsOfADocumentCutAnywhere) {
     }
 }
 
+TEST(Histories, ShareTheirStepsWithCopies) {
+    const boost::intrusive_ptr<UndoableStep> step(new Step('s'));
+    UndoRedoSequence history;
+    history.addUndoable(step);
+    UndoRedoSequence copy(history);
+    EXPECT_EQ(copy.getLast(), step);
+    EXPECT_TRUE(copy.undo());
+    EXPECT_EQ(history.getUndoStackSize(), 1);
+    history = copy;
+    EXPECT_EQ(history.getRedoStackSize(), 1);
+}
+
 }  // namespace

@@ -34,17 +34,6 @@ std::streamsize ArchiveFileBuffer::xsgetn(char* to, std::streamsize count) {
                         fill(to + atHand, static_cast<std::size_t>(count - atHand)));
 }
 
-ArchiveFileBuffer::pos_type ArchiveFileBuffer::seekoff(off_type offset, std::ios_base::seekdir from,
-                                                       std::ios_base::openmode which) {
-    RegularFile::Identity identity{};
-    off_type start = 0;
-    if (from == std::ios_base::cur)
-        start = static_cast<off_type>(next) - (egptr() - gptr());
-    else if (from == std::ios_base::end && file.identify(identity))
-        start = static_cast<off_type>(identity.size);
-    return seekpos(start + offset, which);
-}
-
 ArchiveFileBuffer::pos_type ArchiveFileBuffer::seekpos(pos_type position,
                                                        std::ios_base::openmode /*which*/) {
     const off_type offset = position;

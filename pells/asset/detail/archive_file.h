@@ -22,8 +22,6 @@ protected:
     /// Reads straight into the reader's memory.
     std::streamsize xsgetn(char* to, std::streamsize count) override;
 
-    pos_type seekoff(off_type offset, std::ios_base::seekdir from,
-                     std::ios_base::openmode which) override;
     pos_type seekpos(pos_type position, std::ios_base::openmode which) override;
 
 private:
