@@ -151,4 +151,13 @@ TEST(AssetOpener, TellsTimesBeyond32BitsByTheNearestOne) {
     }
 }
 
+TEST(StreamContainers, SayInWordsThatAFileCannotBeOpened) {
+    try {
+        pells::iTemporaryStreamContainer container("none");
+        FAIL() << "it was opened";
+    } catch (const std::exception& failure) {
+        EXPECT_STREQ(failure.what(), "no regular file of that name can be opened");
+    }
+}
+
 }  // namespace

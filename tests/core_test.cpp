@@ -3,6 +3,7 @@
 #include <sstream>
 #include "pells/core/check_memory.h"
 
+#include "pells/core/class_name.h"
 #include "pells/core/factory.h"
 #include "pells/core/named_object.h"
 #include "pells/core/prefs.h"
@@ -11,6 +12,10 @@
 #include "pells/core/strings.h"
 #include "pells/core/version.h"
 #include "support/test_prefs.h"
+
+namespace mypells {
+struct Inner {};
+}  // namespace mypells
 
 using namespace pells;
 using pells_test::Lines;
@@ -152,6 +157,18 @@ TEST(CheckMemory, TakesAnyNameWithoutAnAllocatorThatCounts) {
     CheckMemory::setMemTracking("some");
     CheckMemory::dumpMemory("some");
     CheckMemory::removeMemTracking("some");
+}
+
+TEST(ClassName, LosesTheOutermostNamespaceOfTheLibraryAlone) {
+    EXPECT_EQ(className(typeid(smart_base)), "smart_base");
+    EXPECT_EQ(className(typeid(mypells::Inner)), "mypells::Inner");
+    EXPECT_EQ(className(typeid(std::pair<smart_base, mypells::Inner>)),
+              "std::pair<smart_base, mypells::Inner>");
+}
+
+TEST(Errors, SayInWordsWhatIsMissing) {
+    EXPECT_STREQ(NamedObject<FactoryByName>::NotFound().what(),
+                 "no object is registered under the name");
 }
 
 }  // namespace

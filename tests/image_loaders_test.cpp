@@ -188,4 +188,19 @@ TEST_F(ImageLoading, DefinitionsThatCannotBeReadLeaveNothingBehind) {
     }
 }
 
+struct PlacelessLoader : pells::ImageLoaderBase {
+    bool uploadImage(pells::Image_base* /*image*/) override { return true; }
+};
+
+TEST(ImageLoaders, WithoutAPlaceIgnoreWhereItBegins) {
+    pells::Image_base image(1, 1);
+    PlacelessLoader placeless;
+    placeless.appendPathInfo("folder/");
+    EXPECT_TRUE(placeless.uploadImage(&image));
+    pells::FileLoader file("name");
+    file.appendPathInfo("folder/");
+    EXPECT_EQ(file.getFileName(), "folder/name");
+    EXPECT_FALSE(file.uploadImage(&image));
+}
+
 }  // namespace

@@ -5,7 +5,6 @@
 #include <cmath>
 #include <cstdint>
 #include <fstream>
-#include <iomanip>
 #include <limits>
 #include <locale>
 #include <random>
@@ -240,6 +239,12 @@ TEST_F(LogTest, WritesNumbersOfEveryWidth) {
                                              << 4294967295UL << ' ' << -2147483647L);
     EXPECT_EQ(logLines("app: "),
               Lines{"18446744073709551615 -9223372036854775808 4294967295 -2147483647"});
+}
+
+TEST_F(LogTest, AppliesAWidthThatWasLeftBehindToTheNextTag) {
+    pells::Log::instance().getStream().width(6);
+    PELLS_LOG("app", "second");
+    EXPECT_EQ(logLines("   app: "), Lines{"second"});
 }
 
 }  // namespace

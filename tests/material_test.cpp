@@ -129,4 +129,15 @@ TEST_F(MaterialTest, BlendsHalfwayInHueAndKeepsItsTexture) {
     }
 }
 
+TEST(MaterialTest, IsAssignedWhole) {
+    pells::Material brass;
+    brass.setShininess(7);
+    brass.setTextureData("grain", 2, 90);
+    pells::Material other;
+    other = brass;
+    EXPECT_EQ(other.shininess(), 7);
+    EXPECT_EQ(other.textureName(), "grain");
+    EXPECT_EQ(other.textureAngle(), 90);
+}
+
 }  // namespace

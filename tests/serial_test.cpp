@@ -290,4 +290,44 @@ TEST(Enums, NameAnObjectOrFail) {
               "No Enum value 'Vulcan' for Enum<(anonymous namespace)::Planet>");
 }
 
+struct Numbered : pells::Serializable {
+    int number = 0;
+};
+
+struct ReadOnlyField : pells::Field {
+    using Field::Field;
+    void load(pells::Serializable* /*obj*/, pells::InTag& /*tag*/) override {}
+};
+
+TEST(PartsOfFields, DoNothingInTheDirectionThatTheyAreNotFor) {
+    std::ostringstream out;
+    pells::OutTag tag(out, "x");
+    pells::IgnoreField().save(nullptr, tag);
+    ReadOnlyField("x").save(nullptr, tag);
+    pells::TextTypeHandler<int>::TextReader().save(1, tag);
+    EXPECT_EQ(out.str(), "");
+    std::vector<int> numbers{1};
+    pells::InPlaceSequenceLoader<std::vector<int>> loader(&numbers);
+    EXPECT_FALSE(loader.hasMore(nullptr));
+    EXPECT_EQ(*loader.next(nullptr), 0);
+    std::vector<std::string> texts{"a"};
+    EXPECT_EQ(*pells::InPlaceSequenceLoader<std::vector<std::string>>(&texts).next(nullptr), "");
+    typedef pells::SequenceTypeHandler<std::vector<int>>::SequenceSaver<const int*> Saver;
+    EXPECT_NE(Saver(numbers.data(), numbers.data() + 1).target(nullptr), numbers.data());
+    pells::MemberAccessor<Numbered, int> accessor(&Numbered::number);
+    EXPECT_THROW(accessor.target(nullptr), std::bad_cast);
+    const pells::ClassDesc desc(pells::makeField("number", &Numbered::number));
+    Numbered object;
+    pells::CompositeField("x", desc).save(&object, tag);
+    EXPECT_EQ(out.str(), "<x>\n    <number>0</number>\n</x>\n");
+}
+
+TEST(PartsOfFields, ThatAreIgnoredReadTheirElementToItsEnd) {
+    std::istringstream in("<root><a>1</a><b/></root><next/>");
+    pells::XMLTokenizer tokenizer(in);
+    pells::OpenTag root(tokenizer, tokenizer.getToken());
+    pells::IgnoreField().load(nullptr, root);
+    EXPECT_EQ(tokenizer.getToken().value, "next");
+}
+
 }  // namespace

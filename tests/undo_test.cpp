@@ -248,6 +248,7 @@ TEST(Histories, ShareTheirStepsWithCopies) {
     history.addUndoable(step);
     UndoRedoSequence copy(history);
     EXPECT_EQ(copy.getLast(), step);
+    EXPECT_EQ(step->getFeatureId(), std::vector<int>());
     EXPECT_TRUE(copy.undo());
     EXPECT_EQ(history.getUndoStackSize(), 1);
     history = copy;
