@@ -129,7 +129,7 @@ TEST_F(MaterialTest, BlendsHalfwayInHueAndKeepsItsTexture) {
     }
 }
 
-TEST(MaterialTest, IsAssignedWhole) {
+TEST(Materials, AreAssignedWhole) {
     pells::Material brass;
     brass.setShininess(7);
     brass.setTextureData("grain", 2, 90);
