@@ -83,9 +83,9 @@ TEST_F(AtomicFileTest, KeepsTheOldFileWhereTheDiskIsFull) {
 }
 
 TEST_F(AtomicFileTest, IsGoneAfterASignalHoweverManyThereAre) {
-    std::vector<std::unique_ptr<AtomicFile>> many;
-    for (int i = 0; i < 17; ++i)
-        many.push_back(std::make_unique<AtomicFile>("file" + std::to_string(i)));
+    std::vector<std::unique_ptr<AtomicFile>> many(17);
+    for (auto& each : many)
+        each = std::make_unique<AtomicFile>("file" + std::to_string(&each - many.data()));
     AtomicFile::removeOnSignal();
     EXPECT_EQ(files().size(), 1U);
     EXPECT_TRUE(AtomicFile::isTemporaryName(files().front()));

@@ -9,8 +9,8 @@
 #include "support/archive_bytes.h"
 #include "support/scratch_directory.h"
 
-#include "samples/core_2.cpp"  // the preferences of this program
-#include "samples/core_3.cpp"
+#include "samples/core_2.inc"  // the preferences of this program
+#include "samples/core_3.inc"
 
 namespace {
 
@@ -44,7 +44,7 @@ void load(pells::Serializable& object, const std::string& document) {
 }
 
 TEST_F(Page, Core) {
-#include "samples/core_1.cpp"
+#include "samples/core_1.inc"
     EXPECT_EQ(Renderer::singleton, nullptr);
     EXPECT_EQ(&SharedRenderer::instance(), SharedRenderer::singleton);
     EXPECT_EQ(pells::Prefs::instance().getString("assetLocation"), "assets");
@@ -54,7 +54,7 @@ TEST_F(Page, Logging) {
     scratch.write("pells.log.prefs", "app");
     const int count = 12;
     const std::string name = "wheel";
-#include "samples/logging_1.cpp"
+#include "samples/logging_1.inc"
     pells::Log::instance().close();
     EXPECT_NE(readFile("pells.log").find("\napp.load: read 12 parts of wheel\n"),
               std::string::npos);
@@ -66,15 +66,15 @@ TEST_F(Page, Assets) {
                   archiveOf({{"fonts/large.txt", "large"}, {"fonts/small.txt", "small"}}));
     std::string text;
     const auto read = [&text](std::istream& in) { text = readAll(in); };
-#include "samples/assets_1.cpp"
+#include "samples/assets_1.inc"
     EXPECT_EQ(text, "stones");
     const auto& load = read;
-#include "samples/assets_2.cpp"
+#include "samples/assets_2.inc"
     EXPECT_EQ(text, "small");
 }
 
 TEST_F(Page, Xml) {
-#include "samples/xml_1.cpp"
+#include "samples/xml_1.inc"
     Part part;
     load(part, "<part><weight>2.5</weight><title>wheel</title></part>");
     EXPECT_EQ(saved(part, "part"),
@@ -108,14 +108,14 @@ struct {
 } document;
 
 TEST_F(Page, Editing) {
-#include "samples/editing_1.cpp"
+#include "samples/editing_1.inc"
     EXPECT_EQ(document.title, "Hall");
     EXPECT_EQ(saved(history, "history"), sample("editing_1.xml"));
     pells::UndoRedoSequence replayed;
     load(replayed, sample("editing_1.xml"));
     EXPECT_EQ(document.title, "Hall");
     EXPECT_EQ(replayed.getUndoStackSize(), 1);
-#include "samples/editing_2.cpp"
+#include "samples/editing_2.inc"
 }
 
 TEST_F(Page, Images) {
